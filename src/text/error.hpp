@@ -35,9 +35,10 @@ inline constexpr long kInvalidColValue = 30010; // grid: invalid column value
 inline constexpr long kItemNotFound = 3265;     // record set: item not found in this collection
 inline constexpr long kNoCurrentRecord = 3021;  // record set: BOF or EOF, or record deleted
 inline constexpr long kClosed = 3704;           // record set: operation not allowed when closed
-inline constexpr long kBadArguments = 3001;     // record set: arguments of the wrong type or out of range
-inline constexpr long kOpenAlready = 3705;      // record set: operation not allowed when open
-inline constexpr long kDataService = 3709;      // catalogue data service failure
+inline constexpr long kBadArguments =
+    3001; // record set: arguments of the wrong type or out of range
+inline constexpr long kOpenAlready = 3705; // record set: operation not allowed when open
+inline constexpr long kDataService = 3709; // catalogue data service failure
 } // namespace err
 
 } // namespace belvane

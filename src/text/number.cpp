@@ -106,12 +106,15 @@ std::string FormatNumber(double value, std::string_view pattern) {
     d.point = 0;
   }
   const int keep = d.point + info.decimals; // digits kept
-  if (static_cast<int>(d.digits.size()) < keep) d.digits.append(static_cast<size_t>(keep) - d.digits.size(), '0');
-  bool roundUp = static_cast<int>(d.digits.size()) > keep && d.digits[static_cast<size_t>(keep)] >= '5';
+  if (static_cast<int>(d.digits.size()) < keep)
+    d.digits.append(static_cast<size_t>(keep) - d.digits.size(), '0');
+  bool roundUp =
+      static_cast<int>(d.digits.size()) > keep && d.digits[static_cast<size_t>(keep)] >= '5';
   d.digits.resize(static_cast<size_t>(keep));
   if (roundUp) {
     int i = keep - 1;
-    while (i >= 0 && d.digits[static_cast<size_t>(i)] == '9') d.digits[static_cast<size_t>(i--)] = '0';
+    while (i >= 0 && d.digits[static_cast<size_t>(i)] == '9')
+      d.digits[static_cast<size_t>(i--)] = '0';
     if (i >= 0) {
       ++d.digits[static_cast<size_t>(i)];
     } else {
@@ -154,8 +157,10 @@ std::string Format(std::string_view value, std::string_view pattern) {
 
 std::optional<double> ParseNumber(std::string_view s) {
   const NumberLocale& loc = CurrentNumberLocale();
-  while (!s.empty() && IsBlank(s.front())) s.remove_prefix(1);
-  while (!s.empty() && IsBlank(s.back())) s.remove_suffix(1);
+  while (!s.empty() && IsBlank(s.front()))
+    s.remove_prefix(1);
+  while (!s.empty() && IsBlank(s.back()))
+    s.remove_suffix(1);
   if (s.empty()) return std::nullopt;
 
   std::string plain; // "C" form: [-]digits[.digits]

@@ -34,9 +34,9 @@ private:
 };
 
 // The patterns the system uses.
-inline constexpr std::string_view kHours = "###,##0.00";     // hours, rates, unit costs
-inline constexpr std::string_view kPrice = "###,##0.000";    // prices with markup
-inline constexpr std::string_view kPlain = "###0.00";        // no grouping
+inline constexpr std::string_view kHours = "###,##0.00";  // hours, rates, unit costs
+inline constexpr std::string_view kPrice = "###,##0.000"; // prices with markup
+inline constexpr std::string_view kPlain = "###0.00";     // no grouping
 
 // Formats a number with a pattern of the form "#,##0.00" (any count of
 // '#'/'0' before the point, a ',' anywhere there turns on grouping by

@@ -188,10 +188,9 @@ std::string Utf8ToCp1252(std::string_view utf8) {
     auto b = ToCp1252(*c);
     if (!b) {
       char buf[128];
-      std::snprintf(buf, sizeof buf,
-                    "Character U+%04X (\"%s\") at offset %zu cannot be held in Windows-1252",
-                    static_cast<unsigned>(*c), std::string(utf8.substr(start, i - start)).c_str(),
-                    start);
+      std::snprintf(
+          buf, sizeof buf, "Character U+%04X (\"%s\") at offset %zu cannot be held in Windows-1252",
+          static_cast<unsigned>(*c), std::string(utf8.substr(start, i - start)).c_str(), start);
       throw Error(err::kInvalidCall, buf, "Belvane.Text");
     }
     out.push_back(static_cast<char>(*b));

@@ -65,8 +65,8 @@ TEST(ParseNumber, AcceptsWhatAnEstimatorTypes) {
 
 TEST(ParseNumber, RefusesNonNumbers) {
   ScopedNumberLocale loc(English());
-  for (const char* bad : {"", "   ", "abc", "1.2.3", "--1", "+-1", "1 2", "+", "-", ".", ",1",
-                          "1,", "1,,2", "1.5,0", "1e5", "$5", "(5)", "5-", "0x10"}) {
+  for (const char* bad : {"", "   ", "abc", "1.2.3", "--1", "+-1", "1 2", "+", "-", ".", ",1", "1,",
+                          "1,,2", "1.5,0", "1e5", "$5", "(5)", "5-", "0x10"}) {
     EXPECT_FALSE(IsNumeric(bad)) << bad;
   }
   EXPECT_THROW(ToDouble("abc"), belvane::Error);

@@ -27,7 +27,8 @@ TEST(Case, AsciiAndLatin1Letters) {
 
 TEST(Cp1252, EveryByteRoundTrips) {
   std::string all;
-  for (int b = 0; b < 256; ++b) all.push_back(static_cast<char>(b));
+  for (int b = 0; b < 256; ++b)
+    all.push_back(static_cast<char>(b));
   std::string utf8 = Cp1252ToUtf8(all);
   EXPECT_EQ(Utf8ToCp1252(utf8), all);
 }
@@ -36,13 +37,14 @@ TEST(Cp1252, MapsTheHighCodes) {
   EXPECT_EQ(Cp1252ToUtf8("\x80"), "€");
   EXPECT_EQ(Cp1252ToUtf8("\xA3"), "£");
   EXPECT_EQ(Cp1252ToUtf8("\x92"), "\u2019");
-  EXPECT_EQ(Utf8ToCp1252("L/H Guard £5 – €"), "L/H Guard \xA3" "5 \x96 \x80");
+  EXPECT_EQ(Utf8ToCp1252("L/H Guard £5 – €"), "L/H Guard \xA3"
+                                              "5 \x96 \x80");
 }
 
 TEST(Cp1252, RefusesWhatItCannotHold) {
   EXPECT_FALSE(TryUtf8ToCp1252("Ω").has_value());
-  EXPECT_FALSE(TryUtf8ToCp1252("\xC3").has_value());        // truncated
-  EXPECT_FALSE(TryUtf8ToCp1252("\xC0\xAF").has_value());    // overlong
+  EXPECT_FALSE(TryUtf8ToCp1252("\xC3").has_value());         // truncated
+  EXPECT_FALSE(TryUtf8ToCp1252("\xC0\xAF").has_value());     // overlong
   EXPECT_FALSE(TryUtf8ToCp1252("\xED\xA0\x80").has_value()); // surrogate
   try {
     Utf8ToCp1252("abc漢");
