@@ -510,6 +510,13 @@ Value Recordset::StoredOriginal(size_t record, size_t field) const {
   return rec.values[field];
 }
 
+void Recordset::StoredAssign(size_t record, size_t field, const Value& v) {
+  if (record >= records_.size() || field >= fields_.Count())
+    throw Error(err::kSubscript, "Subscript out of range", kSource);
+  records_[record].values[field] = v.ConvertTo(fields_.defs_[field].type);
+  index_.erase(field);
+}
+
 void Recordset::AcceptChanges() {
   RequireOpen();
   std::vector<Record> kept;

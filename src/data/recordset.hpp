@@ -148,6 +148,9 @@ public:
   RecordStatus StoredStatus(size_t record) const;
   const data::Value& StoredValue(size_t record, size_t field) const;
   data::Value StoredOriginal(size_t record, size_t field) const;
+  // Sets a value of a stored record without changing its state (a store
+  // writing back the id it assigned).
+  void StoredAssign(size_t record, size_t field, const data::Value& v);
   // Marks the present state as stored: changed and new records become
   // unchanged, deleted ones are dropped. Moves to the first record.
   void AcceptChanges();
