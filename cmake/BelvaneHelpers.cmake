@@ -9,6 +9,10 @@ function(belvane_layer name)
     $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/src>
     $<INSTALL_INTERFACE:include/belvane/internal>)
   target_link_libraries(belvane_${name} PUBLIC ${L_DEPENDS} PRIVATE belvane_warnings ${L_PRIVATE_DEPENDS})
+  set_property(GLOBAL APPEND PROPERTY BELVANE_LAYERS belvane_${name})
+  install(TARGETS belvane_${name} EXPORT BelvaneTargets ARCHIVE DESTINATION lib)
+  install(DIRECTORY ${CMAKE_CURRENT_SOURCE_DIR}/ DESTINATION include/belvane/internal/${name}
+          FILES_MATCHING PATTERN "*.hpp")
 endfunction()
 
 # belvane_test(<name> SOURCES ... DEPENDS ...)
