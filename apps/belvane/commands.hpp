@@ -13,5 +13,6 @@ namespace belvane::cli {
 using RegisterFn = void (*)(CLI::App& app, int& exitCode);
 
 void RegisterVersion(CLI::App& app, int& exitCode);
+void RegisterField(CLI::App& app, int& exitCode);
 
 } // namespace belvane::cli

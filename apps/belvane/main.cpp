@@ -27,6 +27,7 @@ int main(int argc, char** argv) {
   int exitCode = 0;
   const RegisterFn groups[] = {
       RegisterVersion,
+      RegisterField,
   };
   for (RegisterFn fn : groups) fn(app, exitCode);
   try {

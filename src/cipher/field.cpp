@@ -1,0 +1,183 @@
+#include "cipher/field.hpp"
+
+#include "cipher/blowfish.hpp"
+#include "cipher/blowfish_string.hpp"
+#include "cipher/byte_utils.hpp"
+#include "text/error.hpp"
+#include "text/strings.hpp"
+
+#include <array>
+#include <cstdint>
+#include <fstream>
+#include <iterator>
+#include <mutex>
+#include <optional>
+#include <system_error>
+
+namespace belvane::cipher {
+
+namespace {
+
+constexpr const char* kSource = "Belvane.Cipher";
+constexpr long kFileNotFound = 53;
+constexpr long kFileAccess = 75;
+// A key file is 72 digits and some whitespace; anything much bigger is the
+// wrong file.
+constexpr std::streamsize kMaxKeyFileBytes = 4096;
+
+// The built-in key: 36 printable character codes. Catalogues are enciphered
+// under these values, so they never change.
+constexpr std::array<std::uint8_t, kFieldKeyBytes> kBuiltInKey = {
+    75, 37, 37,  122, 106, 122, 121, 74, 77, 122, 65, 66, 80, 120, 120, 100, 40, 105,
+    47, 86, 123, 96,  91,  123, 96,  47, 37, 38,  86, 75, 79, 90,  124, 94,  39, 50};
+
+static_assert([] {
+  for (std::uint8_t c : kBuiltInKey) {
+    if (c < 32 || c > 126) return false;
+  }
+  return true;
+}());
+
+std::mutex gHostKeyMutex;
+std::optional<std::string> gHostKeyText; // normalised
+
+bool IsSpace(char c) {
+  return c == ' ' || c == '\t' || c == '\n' || c == '\r' || c == '\v' || c == '\f';
+}
+
+bool IsHexDigit(char c) {
+  return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'F') || (c >= 'a' && c <= 'f');
+}
+
+std::optional<std::string> HostKeyText() {
+  std::lock_guard lock(gHostKeyMutex);
+  return gHostKeyText;
+}
+
+void SetHostKeyText(std::string normalised) {
+  {
+    std::lock_guard lock(gHostKeyMutex);
+    gHostKeyText = std::move(normalised);
+  }
+  InitFieldCipher();
+}
+
+void EnsureKeyed() {
+  if (!BlowfishKeyed()) InitFieldCipher();
+}
+
+} // namespace
+
+std::string BuiltInCipherKeyText() {
+  return StringToHex(
+      std::string_view(reinterpret_cast<const char*>(kBuiltInKey.data()), kBuiltInKey.size()));
+}
+
+std::string BuildCipherKeyText() {
+  if (auto host = HostKeyText()) return *host;
+  std::error_code ec;
+  const auto status = std::filesystem::status(kFieldKeyFilePath, ec);
+  if (ec && ec != std::errc::no_such_file_or_directory) {
+    throw Error(kFileAccess,
+                std::string("Path/File access error: cannot look up the key file ") +
+                    kFieldKeyFilePath + ": " + ec.message(),
+                kSource);
+  }
+  if (std::filesystem::exists(status)) return ReadFieldKeyFile(kFieldKeyFilePath);
+  return BuiltInCipherKeyText();
+}
+
+std::string NormaliseFieldKeyText(std::string_view keyText) {
+  std::string digits;
+  digits.reserve(2 * kFieldKeyBytes);
+  for (std::size_t i = 0; i < keyText.size(); ++i) {
+    const char c = keyText[i];
+    if (IsSpace(c)) continue;
+    if (!IsHexDigit(c)) {
+      throw Error(err::kTypeMismatch,
+                  "Type mismatch: the key text holds a character at position " +
+                      std::to_string(i + 1) + " that is not a hexadecimal digit",
+                  kSource);
+    }
+    digits.push_back(c >= 'a' ? static_cast<char>(c - 'a' + 'A') : c);
+  }
+  if (digits.size() != 2 * kFieldKeyBytes) {
+    throw Error(err::kInvalidCall,
+                "Invalid key: the key text holds " + std::to_string(digits.size()) +
+                    " hexadecimal digits; a key is " + std::to_string(2 * kFieldKeyBytes),
+                kSource);
+  }
+  return digits;
+}
+
+std::string ReadFieldKeyFile(const std::filesystem::path& path) {
+  std::error_code ec;
+  const auto status = std::filesystem::status(path, ec);
+  if (ec == std::errc::no_such_file_or_directory) {
+    throw Error(kFileNotFound, "File not found: key file " + path.string(), kSource);
+  }
+  std::ifstream in;
+  if (!ec && !std::filesystem::is_directory(status)) in.open(path, std::ios::binary);
+  if (!in.is_open()) {
+    throw Error(kFileAccess, "Path/File access error: cannot read key file " + path.string(),
+                kSource);
+  }
+  std::string content(static_cast<std::size_t>(kMaxKeyFileBytes) + 1, '\0');
+  in.read(content.data(), kMaxKeyFileBytes + 1);
+  if (in.bad()) {
+    throw Error(kFileAccess, "Path/File access error: cannot read key file " + path.string(),
+                kSource);
+  }
+  content.resize(static_cast<std::size_t>(in.gcount()));
+  if (content.size() > static_cast<std::size_t>(kMaxKeyFileBytes)) {
+    throw Error(err::kInvalidCall,
+                "Invalid key: key file " + path.string() + " is too large to hold a key text",
+                kSource);
+  }
+  try {
+    return NormaliseFieldKeyText(content);
+  } catch (const Error& e) {
+    throw Error(e.Number(), e.Description() + " (key file " + path.string() + ")", kSource);
+  }
+}
+
+void SetFieldKeyText(std::string_view keyText) { SetHostKeyText(NormaliseFieldKeyText(keyText)); }
+
+void SetFieldKeyFile(const std::filesystem::path& path) { SetHostKeyText(ReadFieldKeyFile(path)); }
+
+void ResetFieldKey() {
+  {
+    std::lock_guard lock(gHostKeyMutex);
+    gHostKeyText.reset();
+  }
+  InitBlowfishTables();
+}
+
+void InitFieldCipher() {
+  const std::string keyText = BuildCipherKeyText();
+  std::array<std::uint8_t, kFieldKeyBytes> key{};
+  const std::size_t count = HexToBytes(keyText, key);
+  BlowfishInitKey(key, static_cast<int>(count));
+}
+
+std::string EncryptField(std::string_view utf8) {
+  const std::string bytes = text::Utf8ToCp1252(utf8);
+  EnsureKeyed();
+  return StringToHex(BlowfishEncryptString(bytes));
+}
+
+std::string DecryptField(std::string_view fieldText) {
+  if (fieldText.empty()) return {};
+  const std::string bytes = HexToString(fieldText);
+  if (bytes.size() < kBlowfishBlockBytes) {
+    throw Error(err::kSubscript,
+                "Subscript out of range: an enciphered field text of " +
+                    std::to_string(fieldText.size()) +
+                    " digits is shorter than one block (16 digits)",
+                kSource);
+  }
+  EnsureKeyed();
+  return text::Cp1252ToUtf8(BlowfishDecryptString(bytes));
+}
+
+} // namespace belvane::cipher
