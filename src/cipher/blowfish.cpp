@@ -25,24 +25,28 @@ thread_local constinit ThreadCipher tCipher;
 
 // N independent blocks at once. A round depends on the one before it, so a
 // single block leaves the processor waiting on each S-box load; interleaving
-// blocks fills those waits. Two rounds per step, so the halves need no swap.
+// blocks fills those waits. Each P-array word is folded into the half that
+// the next round's F will read while the current F is still being computed,
+// which keeps it off that chain of dependent loads; the result is the same
+// as applying P(i) to the half before F, round by round.
 template <std::size_t N>
 [[gnu::always_inline]] inline void Encipher(const BlowfishState& st, std::uint32_t* l,
                                             std::uint32_t* r) {
+#pragma GCC unroll 4
+  for (std::size_t k = 0; k < N; ++k)
+    l[k] ^= st.P[0];
 #pragma GCC unroll 8
-  for (std::size_t i = 0; i < 16; i += 2) {
+  for (std::size_t i = 1; i < 17; i += 2) {
 #pragma GCC unroll 4
     for (std::size_t k = 0; k < N; ++k) {
-      l[k] ^= st.P[i];
-      r[k] ^= F(st, l[k]);
-      r[k] ^= st.P[i + 1];
-      l[k] ^= F(st, r[k]);
+      r[k] = (r[k] ^ st.P[i]) ^ F(st, l[k]);
+      l[k] = (l[k] ^ st.P[i + 1]) ^ F(st, r[k]);
     }
   }
 #pragma GCC unroll 4
   for (std::size_t k = 0; k < N; ++k) {
     const std::uint32_t left = r[k] ^ st.P[17];
-    r[k] = l[k] ^ st.P[16];
+    r[k] = l[k];
     l[k] = left;
   }
 }
@@ -50,20 +54,21 @@ template <std::size_t N>
 template <std::size_t N>
 [[gnu::always_inline]] inline void Decipher(const BlowfishState& st, std::uint32_t* l,
                                             std::uint32_t* r) {
+#pragma GCC unroll 4
+  for (std::size_t k = 0; k < N; ++k)
+    l[k] ^= st.P[17];
 #pragma GCC unroll 8
-  for (std::size_t i = 17; i > 1; i -= 2) {
+  for (std::size_t i = 16; i > 0; i -= 2) {
 #pragma GCC unroll 4
     for (std::size_t k = 0; k < N; ++k) {
-      l[k] ^= st.P[i];
-      r[k] ^= F(st, l[k]);
-      r[k] ^= st.P[i - 1];
-      l[k] ^= F(st, r[k]);
+      r[k] = (r[k] ^ st.P[i]) ^ F(st, l[k]);
+      l[k] = (l[k] ^ st.P[i - 1]) ^ F(st, r[k]);
     }
   }
 #pragma GCC unroll 4
   for (std::size_t k = 0; k < N; ++k) {
     const std::uint32_t left = r[k] ^ st.P[0];
-    r[k] = l[k] ^ st.P[1];
+    r[k] = l[k];
     l[k] = left;
   }
 }

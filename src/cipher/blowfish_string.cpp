@@ -27,6 +27,12 @@ std::string BlowfishEncryptString(std::string_view plain) {
 }
 
 std::string BlowfishDecryptString(std::string_view data) {
+  std::string out(data.substr(0, data.size() - data.size() % kBlowfishBlockBytes));
+  BlowfishDecryptInPlace(out);
+  return out;
+}
+
+void BlowfishDecryptInPlace(std::string& data) {
   const std::size_t whole = data.size() - data.size() % kBlowfishBlockBytes;
   if (whole == 0) {
     throw Error(err::kSubscript,
@@ -34,13 +40,12 @@ std::string BlowfishDecryptString(std::string_view data) {
                     " bytes holds no whole 8-byte block",
                 "Belvane.Cipher");
   }
-  std::string out(data.substr(0, whole));
-  BlowfishDecipherBytes(Bytes(out));
+  data.resize(whole);
+  BlowfishDecipherBytes(Bytes(data));
   // The pad count is taken against the deciphered length, so bytes past the
   // last whole block never keep padding in the result.
-  const auto pad = static_cast<std::uint8_t>(out.back());
-  if (pad <= kBlowfishBlockBytes) out.resize(whole - pad);
-  return out;
+  const auto pad = static_cast<std::uint8_t>(data.back());
+  if (pad <= kBlowfishBlockBytes) data.resize(whole - pad);
 }
 
 } // namespace belvane::cipher

@@ -21,4 +21,8 @@ std::string BlowfishEncryptString(std::string_view plain);
 // pad bytes are not checked. Data shorter than one block raises error 9.
 std::string BlowfishDecryptString(std::string_view data);
 
+// As BlowfishDecryptString, on `data` in place (no copy for a caller that
+// owns the bytes already). On an error `data` is unchanged.
+void BlowfishDecryptInPlace(std::string& data);
+
 } // namespace belvane::cipher

@@ -168,7 +168,7 @@ std::string EncryptField(std::string_view utf8) {
 
 std::string DecryptField(std::string_view fieldText) {
   if (fieldText.empty()) return {};
-  const std::string bytes = HexToString(fieldText);
+  std::string bytes = HexToString(fieldText);
   if (bytes.size() < kBlowfishBlockBytes) {
     throw Error(err::kSubscript,
                 "Subscript out of range: an enciphered field text of " +
@@ -177,7 +177,13 @@ std::string DecryptField(std::string_view fieldText) {
                 kSource);
   }
   EnsureKeyed();
-  return text::Cp1252ToUtf8(BlowfishDecryptString(bytes));
+  BlowfishDecryptInPlace(bytes);
+  // Most catalogue values are plain ASCII, which reads the same in
+  // Windows-1252 and UTF-8.
+  for (char c : bytes) {
+    if (static_cast<unsigned char>(c) >= 0x80) return text::Cp1252ToUtf8(bytes);
+  }
+  return bytes;
 }
 
 } // namespace belvane::cipher
