@@ -27,7 +27,7 @@ std::string BlowfishEncryptString(std::string_view plain) {
 }
 
 std::string BlowfishDecryptString(std::string_view data) {
-  std::string out(data.substr(0, data.size() - data.size() % kBlowfishBlockBytes));
+  std::string out(data);
   BlowfishDecryptInPlace(out);
   return out;
 }

@@ -9,7 +9,6 @@
 #include <array>
 #include <cstdint>
 #include <fstream>
-#include <iterator>
 #include <mutex>
 #include <optional>
 #include <system_error>

@@ -7,6 +7,7 @@
 
 #include <cmath>
 #include <cstdint>
+#include <functional>
 #include <limits>
 #include <string>
 #include <thread>
@@ -21,6 +22,15 @@ std::vector<std::uint8_t> Hex(std::string_view hex) {
   std::vector<std::uint8_t> out(hex.size() / 2);
   HexToBytes(hex, out);
   return out;
+}
+
+long ErrorNumber(const std::function<void()>& f) {
+  try {
+    f();
+  } catch (const Error& e) {
+    return e.Number();
+  }
+  return 0;
 }
 
 std::uint64_t Block(std::string_view hex) { return std::stoull(std::string(hex), nullptr, 16); }
@@ -114,70 +124,44 @@ TEST(BlowfishVectors, SetKeyLengths1To24) {
 }
 
 TEST(BlowfishVectors, BulkOperationsMatchTheBlockOperation) {
-  const auto key = Hex(kSetKeyKey);
-  ASSERT_TRUE(BlowfishInitKey(key, 24));
+  ASSERT_TRUE(BlowfishInitKey(Hex(kSetKeyKey), 24));
   // 0 to 11 blocks: the interleaved path, the single-block tail, and both.
   for (std::size_t blocks = 0; blocks <= 11; ++blocks) {
-    std::vector<std::uint8_t> bytes(blocks * 8);
-    for (std::size_t i = 0; i < bytes.size(); ++i)
-      bytes[i] = static_cast<std::uint8_t>(i * 37 + 5);
-    std::vector<std::uint32_t> words(blocks * 2);
-    for (std::size_t i = 0; i < words.size(); ++i) {
-      words[i] = BytesToWord(bytes[4 * i], bytes[4 * i + 1], bytes[4 * i + 2], bytes[4 * i + 3]);
+    std::vector<std::uint32_t> plain(blocks * 2);
+    std::vector<std::uint8_t> bytes;
+    for (std::size_t i = 0; i < plain.size(); ++i) {
+      plain[i] = static_cast<std::uint32_t>(0x9E3779B9u * (i + 1));
+      for (std::uint8_t b : WordToBytes(plain[i]))
+        bytes.push_back(b);
     }
-    const auto plainBytes = bytes;
-    const auto plainWords = words;
-    BlowfishEncipherBytes(bytes);
+    std::vector<std::uint32_t> words = plain;
     BlowfishEncipherWords(words);
-    for (std::size_t b = 0; b < blocks; ++b) {
-      std::uint32_t l = plainWords[2 * b];
-      std::uint32_t r = plainWords[2 * b + 1];
+    BlowfishEncipherBytes(bytes);
+    auto wordAt = [&](std::size_t i) {
+      return BytesToWord(bytes[4 * i], bytes[4 * i + 1], bytes[4 * i + 2], bytes[4 * i + 3]);
+    };
+    for (std::size_t i = 0; i < plain.size(); i += 2) {
+      std::uint32_t l = plain[i];
+      std::uint32_t r = plain[i + 1];
       BlowfishEncipherBlock(l, r);
-      EXPECT_EQ(words[2 * b], l);
-      EXPECT_EQ(words[2 * b + 1], r);
-      const auto lb = WordToBytes(l);
-      const auto rb = WordToBytes(r);
-      EXPECT_TRUE(std::equal(lb.begin(), lb.end(), bytes.begin() + 8 * b));
-      EXPECT_TRUE(std::equal(rb.begin(), rb.end(), bytes.begin() + 8 * b + 4));
+      EXPECT_EQ(words[i], l);
+      EXPECT_EQ(words[i + 1], r);
+      EXPECT_EQ(wordAt(i), l);
+      EXPECT_EQ(wordAt(i + 1), r);
     }
-    BlowfishDecipherBytes(bytes);
     BlowfishDecipherWords(words);
-    EXPECT_EQ(bytes, plainBytes) << blocks << " blocks";
-    EXPECT_EQ(words, plainWords) << blocks << " blocks";
+    EXPECT_EQ(words, plain) << blocks << " blocks";
+    BlowfishDecipherBytes(bytes);
+    for (std::size_t i = 0; i < plain.size(); ++i)
+      EXPECT_EQ(wordAt(i), plain[i]);
   }
-}
-
-TEST(BlowfishVectors, PartialBlocksAreRefusedUntouched) {
+  // Partial blocks are refused and left as they are.
   std::vector<std::uint8_t> bytes(12, 0xAB);
   std::vector<std::uint32_t> words(3, 7);
-  for (auto call : {BlowfishEncipherBytes, BlowfishDecipherBytes}) {
-    try {
-      call(bytes);
-      FAIL() << "12 bytes accepted";
-    } catch (const Error& e) {
-      EXPECT_EQ(e.Number(), err::kInvalidCall);
-    }
-  }
-  EXPECT_THROW(BlowfishEncipherWords(words), Error);
+  EXPECT_THROW(BlowfishEncipherBytes(bytes), Error);
   EXPECT_THROW(BlowfishDecipherWords(words), Error);
   EXPECT_EQ(bytes, std::vector<std::uint8_t>(12, 0xAB));
   EXPECT_EQ(words, std::vector<std::uint32_t>(3, 7));
-}
-
-TEST(BlowfishKey, TablesResetToTheInitialValues) {
-  const auto key = Hex(kSetKeyKey);
-  ASSERT_TRUE(BlowfishInitKey(key, 24));
-  EXPECT_TRUE(BlowfishKeyed());
-  InitBlowfishTables();
-  EXPECT_FALSE(BlowfishKeyed());
-  const BlowfishState& st = BlowfishCurrentState();
-  EXPECT_EQ(st.P[0], 0x243F6A88u);
-  EXPECT_EQ(st.P[1], 0x85A308D3u);
-  EXPECT_EQ(st.P[17], 0x8979FB1Bu);
-  EXPECT_EQ(st.S[0][0], 0xD1310BA6u);
-  EXPECT_EQ(st.S[0][1], 0x98DFB5ACu);
-  EXPECT_EQ(st.S[2][0], 0xE93D5A68u);
-  EXPECT_EQ(st.S[3][255], 0x3AC372E6u);
 }
 
 TEST(BlowfishKey, RefusedLengthsKeepThePreviousKey) {
@@ -193,13 +177,13 @@ TEST(BlowfishKey, RefusedLengthsKeepThePreviousKey) {
   }
   // A length within the rule but beyond the bytes given is an error, and the
   // key stays as it was.
-  try {
-    BlowfishInitKey(std::span(key).first(10), 11);
-    FAIL() << "length beyond the key bytes accepted";
-  } catch (const Error& e) {
-    EXPECT_EQ(e.Number(), err::kSubscript);
-  }
+  EXPECT_EQ(ErrorNumber([&] { BlowfishInitKey(std::span(key).first(10), 11); }), err::kSubscript);
   EXPECT_EQ(BlowfishCurrentState(), keyed56);
+
+  InitBlowfishTables();
+  EXPECT_FALSE(BlowfishKeyed());
+  EXPECT_EQ(BlowfishCurrentState().P[0], 0x243F6A88u);
+  EXPECT_EQ(BlowfishCurrentState().S[3][255], 0x3AC372E6u);
 }
 
 TEST(BlowfishKey, SetupDependsOnlyOnTheKey) {
@@ -213,12 +197,6 @@ TEST(BlowfishKey, SetupDependsOnlyOnTheKey) {
   EXPECT_NE(BlowfishCurrentState(), once);
   ASSERT_TRUE(BlowfishInitKey(b, 24));
   EXPECT_EQ(BlowfishCurrentState(), once);
-
-  // Key bytes are used cyclically, so a key and its repetition are one key.
-  ASSERT_TRUE(BlowfishInitKey(Hex("0123456789ABCDEF0123456789ABCDEF"), 16));
-  const BlowfishState repeated = BlowfishCurrentState();
-  ASSERT_TRUE(BlowfishInitKey(a, 8));
-  EXPECT_EQ(BlowfishCurrentState(), repeated);
 
   // The empty key is accepted and is the key of zero bytes.
   ASSERT_TRUE(BlowfishInitKey({}, 0));
@@ -247,24 +225,12 @@ TEST(BlowfishKey, EachThreadHasItsOwnState) {
   EXPECT_EQ(BlowfishCurrentState(), mine);
 }
 
-TEST(UnsignedWord, ByteOrderAndConversions) {
-  EXPECT_EQ(BytesToWord(0x12, 0x34, 0x56, 0x78), 0x12345678u);
-  EXPECT_EQ(WordToBytes(0xF0E1D2C3), (std::array<std::uint8_t, 4>{0xF0, 0xE1, 0xD2, 0xC3}));
-  EXPECT_EQ(ShiftLeft8(0x12345678), 0x34567800u);
-  EXPECT_EQ(UnsignedAdd(0xFFFFFFFF, 2), 1u);
-  EXPECT_EQ(WordToDouble(0xFFFFFFFF), 4294967295.0);
-
-  EXPECT_EQ(DoubleToWord(0.0), 0u);
+TEST(UnsignedWord, DoubleToWordRangeAndRounding) {
   EXPECT_EQ(DoubleToWord(4294967295.0), 0xFFFFFFFFu);
   EXPECT_EQ(DoubleToWord(2.5), 2u);
   EXPECT_EQ(DoubleToWord(3.5), 4u);
   for (double bad : {-1.0, -0.25, 4294967296.0, 4294967295.5, std::nan(""),
                      std::numeric_limits<double>::infinity()}) {
-    try {
-      DoubleToWord(bad);
-      ADD_FAILURE() << bad << " accepted";
-    } catch (const Error& e) {
-      EXPECT_EQ(e.Number(), err::kOverflow);
-    }
+    EXPECT_EQ(ErrorNumber([&] { DoubleToWord(bad); }), err::kOverflow) << bad;
   }
 }
