@@ -28,6 +28,7 @@ int main(int argc, char** argv) {
   const RegisterFn groups[] = {
       RegisterVersion,
       RegisterField,
+      RegisterCatalogue,
   };
   for (RegisterFn fn : groups) fn(app, exitCode);
   try {

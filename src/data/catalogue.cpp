@@ -1,0 +1,83 @@
+#include "data/catalogue.hpp"
+
+#include "data/sqlite/sqlite_catalogue.hpp"
+
+#include <atomic>
+#include <cstdlib>
+#include <mutex>
+#include <optional>
+
+namespace belvane::data {
+
+namespace {
+
+std::mutex gLocationMutex;
+std::optional<std::string> gLocation; // set by the host; guarded by gLocationMutex
+// Bumped on every SetCatalogueLocation so that each thread notices that its
+// instance was made over an older location.
+std::atomic<unsigned> gLocationGeneration{0};
+
+struct ThreadCatalogue {
+  std::shared_ptr<CatalogueDataObject> object;
+  bool handedOver = false; // the host's own object: kept whatever the location
+  unsigned generation = 0;
+};
+
+ThreadCatalogue& ThisThread() {
+  thread_local ThreadCatalogue state;
+  return state;
+}
+
+const char* NonEmptyEnv(const char* name) {
+  const char* v = std::getenv(name);
+  return v && *v ? v : nullptr;
+}
+
+} // namespace
+
+std::string CatalogueLocation() {
+  {
+    std::lock_guard lock(gLocationMutex);
+    if (gLocation) return *gLocation;
+  }
+  if (const char* env = NonEmptyEnv("BELVANE_CATALOGUE")) return env;
+  if (const char* xdg = NonEmptyEnv("XDG_DATA_HOME"))
+    return std::string(xdg) + "/belvane/catalogue.db";
+  if (const char* home = NonEmptyEnv("HOME"))
+    return std::string(home) + "/.local/share/belvane/catalogue.db";
+  return "catalogue.db";
+}
+
+void SetCatalogueLocation(const std::string& path) {
+  {
+    std::lock_guard lock(gLocationMutex);
+    if (path.empty())
+      gLocation.reset();
+    else
+      gLocation = path;
+  }
+  ++gLocationGeneration;
+}
+
+void SetCatalogueDataObject(std::shared_ptr<CatalogueDataObject> object) {
+  ThreadCatalogue& t = ThisThread();
+  t.handedOver = object != nullptr;
+  t.object = std::move(object);
+  t.generation = gLocationGeneration.load();
+}
+
+std::shared_ptr<CatalogueDataObject> Catalogue() {
+  ThreadCatalogue& t = ThisThread();
+  if (t.handedOver) return t.object;
+  const unsigned generation = gLocationGeneration.load();
+  if (!t.object || t.generation != generation) {
+    t.object.reset();
+    // Construction opens the database; when it throws, nothing is kept and
+    // the next call tries again.
+    t.object = std::make_shared<SqliteCatalogue>(CatalogueLocation());
+    t.generation = generation;
+  }
+  return t.object;
+}
+
+} // namespace belvane::data

@@ -1,0 +1,48 @@
+#pragma once
+// The catalogue data service over an SQLite catalogue database, opened read
+// only. The tables it reads are described in docs/catalogue.md.
+
+#include "data/catalogue.hpp"
+
+#include <memory>
+#include <string>
+
+namespace belvane::data {
+
+namespace sqlite {
+class Database;
+class Statement;
+
+// Reads every row of a prepared statement into a new open record set,
+// positioned on the first record. A field takes the type its column is
+// declared with (INT: 32-bit integer, SMALLINT/TINYINT: 16-bit, BOOL:
+// Boolean, REAL/FLOAT/DOUBLE: Double, CHAR/TEXT/CLOB: text); a column
+// without a usable declared type, or whose values do not fit that type,
+// takes the type its values share, or Variant when they differ. A repeated
+// column name gets "_2", "_3", ... appended.
+RecordsetPtr ReadRecordset(Statement& st);
+} // namespace sqlite
+
+class SqliteCatalogue final : public CatalogueDataObject {
+public:
+  // Opens the catalogue database at `path` read only. A missing or
+  // unreadable file, or one that is not a database, raises
+  // err::kDataService naming the file.
+  explicit SqliteCatalogue(const std::string& path);
+  ~SqliteCatalogue() override;
+
+  const std::string& Path() const;
+
+  RecordsetPtr OpenRecordset(const std::string& sql, long cursorType = 0,
+                             long lockType = 0) override;
+  void GetLabourItems(RecordsetPtr& rs, long schedule, const std::string& firstId,
+                      const std::string& secondId, const std::string& bodyId) override;
+  void GetVehicleParts(RecordsetPtr& rs, const std::string& make, const std::string& catNo,
+                       const std::string& bodyId, int16_t state) override;
+  bool HasVehicleDiagram(const std::string& make) override;
+
+private:
+  std::unique_ptr<sqlite::Database> db_;
+};
+
+} // namespace belvane::data
