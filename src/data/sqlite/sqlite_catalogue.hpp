@@ -1,6 +1,7 @@
 #pragma once
 // The catalogue data service over an SQLite catalogue database, opened read
-// only. The tables it reads are described in docs/catalogue.md.
+// only. The tables it reads are described in docs/catalogue.md. Each
+// instance has its own connection; Catalogue() gives every thread its own.
 
 #include "data/catalogue.hpp"
 

@@ -47,7 +47,7 @@ Database::Database(std::string path, Mode mode) : path_(std::move(path)) {
     if (fs::is_directory(path_, ec))
       Fail(err::kDataService, "this is a folder, not a database file");
   }
-  int flags = SQLITE_OPEN_NOMUTEX;
+  int flags = 0;
   switch (mode) {
   case Mode::ReadOnly:
     flags |= SQLITE_OPEN_READONLY;
