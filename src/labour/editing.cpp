@@ -314,8 +314,7 @@ void frmLabour::FGSelectedLabour_LeaveCell() {
 
 void frmLabour::FGSelectedLabour_LostFocus() {
   grid::FlexGrid& g = FGSelectedLabour;
-  if (g.Row() < 1 || IsGrey(g, g.Row(), g.Col())) return;
-  g.CellBackColor(grid::kWhite);
+  if (g.Row() >= 1 && !IsGrey(g, g.Row(), g.Col())) g.CellBackColor(grid::kWhite);
   // The focus going to the editor laid over this very cell does not leave
   // the cell: its text is formatted when the editor closes, not before the
   // estimator has typed.
