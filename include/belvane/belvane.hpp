@@ -1,8 +1,15 @@
 #pragma once
-// The one header a host includes. It brings the record set the host passes
-// to the editors and the quote store a host may keep its quotes in.
+// The one header a host includes: CForms and the editing modes, the record
+// set the host passes to the editors, the catalogue a host points the
+// editors at, the field key a deployment may set, the runtime seam (the
+// headless runtime; a desktop host installs the Qt runtime), and the quote
+// store a host may keep its quotes in.
 
+#include "cipher/field.hpp"
+#include "data/catalogue.hpp"
 #include "data/quote_store.hpp"
 #include "data/recordset.hpp"
 #include "data/value.hpp"
+#include "forms/runtime.hpp"
+#include "host/cforms.hpp"
 #include "text/error.hpp"

@@ -394,63 +394,77 @@ CellStyle FlexGrid::CellStyleAt(int row, int col) const {
 }
 
 Color FlexGrid::CellBackColor() const { return CellStyleAt(row_, col_).backColor; }
-void FlexGrid::CellBackColor(Color color) {
-  CellFormat& f = EditFormat(row_, col_);
+void FlexGrid::CellBackColorAt(int row, int col, Color color) {
+  CheckCell(row, col);
+  CellFormat& f = EditFormat(row, col);
   f.back = color;
   f.set |= CellFormat::kBack;
-  CellChanged(row_, col_);
+  CellChanged(row, col);
 }
+void FlexGrid::CellBackColor(Color color) { CellBackColorAt(row_, col_, color); }
 
 Color FlexGrid::CellForeColor() const { return CellStyleAt(row_, col_).foreColor; }
-void FlexGrid::CellForeColor(Color color) {
-  CellFormat& f = EditFormat(row_, col_);
+void FlexGrid::CellForeColorAt(int row, int col, Color color) {
+  CheckCell(row, col);
+  CellFormat& f = EditFormat(row, col);
   f.fore = color;
   f.set |= CellFormat::kFore;
-  CellChanged(row_, col_);
+  CellChanged(row, col);
 }
+void FlexGrid::CellForeColor(Color color) { CellForeColorAt(row_, col_, color); }
 
 int FlexGrid::CellAlignment() const { return CellStyleAt(row_, col_).alignment; }
-void FlexGrid::CellAlignment(int alignment) {
+void FlexGrid::CellAlignmentAt(int row, int col, int alignment) {
+  CheckCell(row, col);
   CheckAlignment(alignment);
-  CellFormat& f = EditFormat(row_, col_);
+  CellFormat& f = EditFormat(row, col);
   f.alignment = static_cast<std::uint8_t>(alignment);
   f.set |= CellFormat::kAlign;
-  CellChanged(row_, col_);
+  CellChanged(row, col);
 }
+void FlexGrid::CellAlignment(int alignment) { CellAlignmentAt(row_, col_, alignment); }
 
 std::string FlexGrid::CellFontName() const { return CellStyleAt(row_, col_).fontName; }
-void FlexGrid::CellFontName(std::string_view name) {
+void FlexGrid::CellFontNameAt(int row, int col, std::string_view name) {
+  CheckCell(row, col);
   const std::uint16_t index = FontIndex(name);
-  CellFormat& f = EditFormat(row_, col_);
+  CellFormat& f = EditFormat(row, col);
   f.font = index;
   f.set |= CellFormat::kFont;
-  CellChanged(row_, col_);
+  CellChanged(row, col);
 }
+void FlexGrid::CellFontName(std::string_view name) { CellFontNameAt(row_, col_, name); }
 
 double FlexGrid::CellFontSize() const { return CellStyleAt(row_, col_).fontSize; }
-void FlexGrid::CellFontSize(double points) {
+void FlexGrid::CellFontSizeAt(int row, int col, double points) {
+  CheckCell(row, col);
   if (!(points > 0)) throw Error(kInvalidPropertyValue, "Invalid property value");
-  CellFormat& f = EditFormat(row_, col_);
+  CellFormat& f = EditFormat(row, col);
   f.size = points;
   f.set |= CellFormat::kSize;
-  CellChanged(row_, col_);
+  CellChanged(row, col);
 }
+void FlexGrid::CellFontSize(double points) { CellFontSizeAt(row_, col_, points); }
 
 bool FlexGrid::CellFontBold() const { return CellStyleAt(row_, col_).fontBold; }
-void FlexGrid::CellFontBold(bool bold) {
-  CellFormat& f = EditFormat(row_, col_);
+void FlexGrid::CellFontBoldAt(int row, int col, bool bold) {
+  CheckCell(row, col);
+  CellFormat& f = EditFormat(row, col);
   f.bold = bold;
   f.set |= CellFormat::kBold;
-  CellChanged(row_, col_);
+  CellChanged(row, col);
 }
+void FlexGrid::CellFontBold(bool bold) { CellFontBoldAt(row_, col_, bold); }
 
 bool FlexGrid::CellFontItalic() const { return CellStyleAt(row_, col_).fontItalic; }
-void FlexGrid::CellFontItalic(bool italic) {
-  CellFormat& f = EditFormat(row_, col_);
+void FlexGrid::CellFontItalicAt(int row, int col, bool italic) {
+  CheckCell(row, col);
+  CellFormat& f = EditFormat(row, col);
   f.italic = italic;
   f.set |= CellFormat::kItalic;
-  CellChanged(row_, col_);
+  CellChanged(row, col);
 }
+void FlexGrid::CellFontItalic(bool italic) { CellFontItalicAt(row_, col_, italic); }
 
 // ---- columns and rows ----
 
@@ -503,7 +517,7 @@ int FlexGrid::FixedHeight() const { return RowHeight(0); }
 
 int FlexGrid::MaxTopRow() const {
   if (Rows() <= FixedRows()) return 1;
-  const int room = Height() - FixedHeight();
+  const int room = RoomHeight() - FixedHeight();
   int top = Rows() - 1;
   int used = RowHeight(top);
   while (top > FixedRows() && used + RowHeight(top - 1) <= room) {
@@ -516,11 +530,70 @@ int FlexGrid::MaxTopRow() const {
 int FlexGrid::MaxLeftCol() const {
   int left = cols_ - 1;
   int used = colWidths_[static_cast<std::size_t>(left)];
-  while (left > 0 && used + colWidths_[static_cast<std::size_t>(left - 1)] <= Width()) {
+  while (left > 0 && used + colWidths_[static_cast<std::size_t>(left - 1)] <= RoomWidth()) {
     --left;
     used += colWidths_[static_cast<std::size_t>(left)];
   }
   return left;
+}
+
+// ---- scroll bars ----
+
+void FlexGrid::ScrollBarSize(int twips) {
+  if (twips < 0) throw Error(kInvalidPropertyValue, "Invalid property value");
+  if (twips == scrollBarSize_) return;
+  scrollBarSize_ = twips;
+  Notify([](ModelObserver& o) { o.LayoutChanged(); });
+  ClampCurrent();
+}
+
+bool FlexGrid::RowsExceed(int room) const {
+  int used = 0;
+  for (int r = 0; r < Rows(); ++r) {
+    used += RowHeight(r);
+    if (used > room) return true;
+  }
+  return false;
+}
+
+bool FlexGrid::ColsExceed(int room) const {
+  int used = 0;
+  for (int w : colWidths_) {
+    used += w;
+    if (used > room) return true;
+  }
+  return false;
+}
+
+void FlexGrid::ScrollBars(bool& vertical, bool& horizontal) const {
+  const bool tall = RowsExceed(Height());
+  const bool wide = ColsExceed(Width());
+  horizontal = wide || (tall && ColsExceed(Width() - scrollBarSize_));
+  vertical = tall || (horizontal && RowsExceed(Height() - scrollBarSize_));
+}
+
+bool FlexGrid::VScrollBarShown() const {
+  bool vertical = false;
+  bool horizontal = false;
+  ScrollBars(vertical, horizontal);
+  return vertical;
+}
+
+bool FlexGrid::HScrollBarShown() const {
+  bool vertical = false;
+  bool horizontal = false;
+  ScrollBars(vertical, horizontal);
+  return horizontal;
+}
+
+int FlexGrid::RoomWidth() const {
+  if (scrollBarSize_ == 0) return Width();
+  return std::max(0, Width() - (VScrollBarShown() ? scrollBarSize_ : 0));
+}
+
+int FlexGrid::RoomHeight() const {
+  if (scrollBarSize_ == 0) return Height();
+  return std::max(0, Height() - (HScrollBarShown() ? scrollBarSize_ : 0));
 }
 
 void FlexGrid::ScrollTo(int topRow, int leftCol) {
@@ -548,20 +621,22 @@ bool FlexGrid::IsCellVisible(int row, int col) const {
   CheckCell(row, col);
   bool rowShown = row < FixedRows() || row == topRow_;
   if (!rowShown && row > topRow_) {
+    const int room = RoomHeight();
     int bottom = FixedHeight();
     rowShown = true;
     for (int r = topRow_; r <= row && rowShown; ++r) {
       bottom += RowHeight(r);
-      rowShown = bottom <= Height();
+      rowShown = bottom <= room;
     }
   }
   bool colShown = col == leftCol_;
   if (!colShown && col > leftCol_) {
+    const int room = RoomWidth();
     int right = 0;
     colShown = true;
     for (int c = leftCol_; c <= col && colShown; ++c) {
       right += colWidths_[static_cast<std::size_t>(c)];
-      colShown = right <= Width();
+      colShown = right <= room;
     }
   }
   return rowShown && colShown;
@@ -575,7 +650,7 @@ void FlexGrid::EnsureVisible(int row, int col) {
     if (row < topRow_) {
       top = row;
     } else {
-      const int room = Height() - FixedHeight();
+      const int room = RoomHeight() - FixedHeight();
       top = row;
       int used = RowHeight(row);
       while (top > FixedRows() && used + RowHeight(top - 1) <= room) {
@@ -590,10 +665,11 @@ void FlexGrid::EnsureVisible(int row, int col) {
     int right = 0;
     for (int c = leftCol_; c <= col; ++c)
       right += colWidths_[static_cast<std::size_t>(c)];
-    if (right > Width()) {
+    const int room = RoomWidth();
+    if (right > room) {
       left = col;
       int used = colWidths_[static_cast<std::size_t>(col)];
-      while (left > 0 && used + colWidths_[static_cast<std::size_t>(left - 1)] <= Width()) {
+      while (left > 0 && used + colWidths_[static_cast<std::size_t>(left - 1)] <= room) {
         --left;
         used += colWidths_[static_cast<std::size_t>(left)];
       }
@@ -652,7 +728,7 @@ int FlexGrid::CellHeight() {
 void FlexGrid::HitTest(int x, int y, int& row, int& col) const {
   row = -1;
   col = -1;
-  if (y >= 0 && y < Height()) {
+  if (y >= 0 && y < RoomHeight()) {
     int bottom = FixedHeight();
     if (y < bottom) {
       row = 0;
@@ -663,7 +739,7 @@ void FlexGrid::HitTest(int x, int y, int& row, int& col) const {
       }
     }
   }
-  if (x >= 0 && x < Width()) {
+  if (x >= 0 && x < RoomWidth()) {
     int right = 0;
     for (int c = leftCol_; c < cols_ && right <= x; ++c) {
       right += colWidths_[static_cast<std::size_t>(c)];
@@ -696,10 +772,11 @@ bool FlexGrid::NavigateByKey(int keyCode, int shift) {
   int page = 0;
   if (keyCode == kKeyPageUp || keyCode == kKeyPageDown) {
     page = 1;
+    const int room = RoomHeight();
     int bottom = FixedHeight();
     for (int r = topRow_ + 1; r <= last; ++r) {
       bottom += RowHeight(r - 1);
-      if (bottom + RowHeight(r) > Height()) break;
+      if (bottom + RowHeight(r) > room) break;
       ++page;
     }
   }

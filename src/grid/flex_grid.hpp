@@ -110,6 +110,15 @@ public:
   void CellFontBold(bool bold);
   bool CellFontItalic() const;
   void CellFontItalic(bool italic);
+  // The same formats set on any cell, without moving the current cell (so
+  // without LeaveCell and EnterCell).
+  void CellBackColorAt(int row, int col, Color color);
+  void CellForeColorAt(int row, int col, Color color);
+  void CellAlignmentAt(int row, int col, int alignment);
+  void CellFontNameAt(int row, int col, std::string_view name);
+  void CellFontSizeAt(int row, int col, double points);
+  void CellFontBoldAt(int row, int col, bool bold);
+  void CellFontItalicAt(int row, int col, bool italic);
   // The effective look of any cell (what a view paints).
   CellStyle CellStyleAt(int row, int col) const;
 
@@ -147,6 +156,22 @@ public:
   int CellHeight();
   // The cell under a point of the grid (row or column -1 outside any cell).
   void HitTest(int x, int y, int& row, int& col) const;
+
+  // ---- scroll bars ----
+  // Thickness in twips of the scroll bars a view draws inside the grid's
+  // rectangle. A bar shows when the rows (or columns) do not fit, counting
+  // the room the other bar takes; the cells in view, the scroll limits and
+  // the page of PageUp/PageDown then leave the bars' room out, so the model
+  // and the view agree on what is seen. 0, the default (no view), leaves
+  // the bars out of the geometry. A view's setting survives Reset.
+  int ScrollBarSize() const noexcept { return scrollBarSize_; }
+  void ScrollBarSize(int twips);
+  bool VScrollBarShown() const;
+  bool HScrollBarShown() const;
+  // The furthest TopRow and LeftCol the grid scrolls to (a view's scroll
+  // bar ranges).
+  int MaxTopRow() const;
+  int MaxLeftCol() const;
 
   // ---- mouse ----
   int MouseRow() const noexcept { return mouseRow_; }
@@ -192,8 +217,12 @@ private:
   std::uint16_t FontIndex(std::string_view name);
   void CellChanged(int row, int col);
   void AllCellsChanged();
-  int MaxTopRow() const;
-  int MaxLeftCol() const;
+  // The room for cells: the grid's size less the scroll bars shown.
+  void ScrollBars(bool& vertical, bool& horizontal) const;
+  int RoomWidth() const;
+  int RoomHeight() const;
+  bool RowsExceed(int room) const;
+  bool ColsExceed(int room) const;
   int FixedHeight() const;
   void FillRow(RowData& row, std::string_view item) const;
 
@@ -209,6 +238,7 @@ private:
   int mouseRow_ = -1;
   int mouseCol_ = -1;
   bool redraw_ = true;
+  int scrollBarSize_ = 0;
 };
 
 } // namespace belvane::grid

@@ -114,3 +114,43 @@ TEST(FlexGridGeometry, KeyboardMovesStayInsideAndScrollAlong) {
   EXPECT_FALSE(g.NavigateByKey(113, 0)); // F2 is not navigation
   EXPECT_EQ(leaves, 3);
 }
+
+TEST(FlexGridGeometry, ScrollBarsOfAViewTakeRoomFromTheCellsInView) {
+  FlexGrid g;
+  Shape(g, 20); // taller and wider than the grid: both bars
+  EXPECT_EQ(g.ScrollBarSize(), 0);
+  EXPECT_TRUE(g.IsCellVisible(5, 2)); // without a view the bars take no room
+
+  g.ScrollBarSize(240);
+  EXPECT_TRUE(g.VScrollBarShown());
+  EXPECT_TRUE(g.HScrollBarShown());
+  EXPECT_FALSE(g.IsCellVisible(5, 0)); // under the horizontal bar
+  EXPECT_FALSE(g.IsCellVisible(1, 2)); // under the vertical bar
+  g.SetCurrentCell(5, 0);
+  EXPECT_EQ(g.CellTop(), 240 + 3 * 240); // scrolled one row so it shows above the bar
+  EXPECT_EQ(g.TopRow(), 2);
+  int row = 0;
+  int col = 0;
+  g.HitTest(100, 6 * 240 - 10, row, col); // a point on the bar is no cell
+  EXPECT_EQ(row, -1);
+  g.TopRow(19); // clamped: the last rows fill the room left above the bar
+  EXPECT_EQ(g.TopRow(), 16);
+
+  // A bar shows only when needed, and one bar can bring the other.
+  FlexGrid fit;
+  fit.Cols(2);
+  fit.ColWidth(0, 1000);
+  fit.ColWidth(1, 1900);
+  fit.Width(3000);
+  fit.Height(6 * kDefaultRowHeight);
+  fit.ScrollBarSize(240);
+  fit.Rows(6); // header and five rows fit exactly
+  EXPECT_FALSE(fit.VScrollBarShown());
+  EXPECT_FALSE(fit.HScrollBarShown());
+  fit.Rows(7); // the vertical bar leaves 2760 for 2900 of columns
+  EXPECT_TRUE(fit.VScrollBarShown());
+  EXPECT_TRUE(fit.HScrollBarShown());
+
+  g.Reset(); // a view's setting is no design state
+  EXPECT_EQ(g.ScrollBarSize(), 240);
+}

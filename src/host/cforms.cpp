@@ -1,0 +1,25 @@
+#include "host/cforms.hpp"
+
+#include "labour/frm_labour.hpp"
+
+namespace belvane {
+
+long CForms::ShowLabourForm(data::RecordsetPtr& prsLab, std::string& psSchedType,
+                            const std::string& psQuoteNo, const std::string& psSubQuoteNo,
+                            const std::string& psMake, const std::string& psModelID,
+                            const std::string& psBodyID, const std::string& psSchedID,
+                            const std::string& psMTAID, const std::string& psThirdID,
+                            double pdRRRate, double pdRARate, double pdPTRate, bool pbDefaultSched,
+                            bool pbInsurerChanged, EQuoteEditMode peMode) {
+  labour::LabourForm().SetQuoteNo(prsLab, psSchedType, psQuoteNo, psSubQuoteNo, psMake, psModelID,
+                                  psBodyID, psSchedID, psMTAID, psThirdID, pdRRRate, pdRARate,
+                                  pdPTRate, pbDefaultSched, pbInsurerChanged, peMode);
+  return 0;
+}
+
+long CForms::SaveLabourChanges() {
+  if (host::gbLabourFormLoaded) labour::LabourForm().SaveChanges();
+  return 0;
+}
+
+} // namespace belvane

@@ -1,0 +1,266 @@
+// frmLabour: the schedule lists, the text search over the current list, and
+// adding a catalogue or search row to the quote's selected lines.
+
+#include "data/catalogue.hpp"
+#include "cipher/field.hpp"
+#include "forms/runtime.hpp"
+#include "labour/frm_labour.hpp"
+#include "text/number.hpp"
+#include "text/strings.hpp"
+
+#include <optional>
+#include <string>
+
+namespace belvane::labour {
+
+namespace {
+
+// An hours value of the catalogue: a plain number, or an enciphered one
+// when its text has 16 characters or more.
+// A plain number may be stored as a number or as its text; an enciphered
+// one holds the number written with "." whatever the reader's locale.
+std::string CatalogueHours(const data::Value& v) {
+  if (v.IsNull()) return {};
+  if (v.IsNumber()) return text::FormatNumber(v.ToDouble(), text::kHours);
+  const std::string t = v.ToText();
+  if (t.size() < 16) return text::Format(t, text::kHours);
+  const std::string plain = cipher::DecryptField(t);
+  std::optional<double> n;
+  {
+    text::ScopedNumberLocale stored({".", ","});
+    n = text::ParseNumber(plain);
+  }
+  return n ? text::FormatNumber(*n, text::kHours) : plain;
+}
+
+// The whole-number value of a mask text ("5", " 7"); 0 when it is none.
+int MaskOf(const std::string& s) {
+  auto n = text::ParseNumber(s);
+  return n ? static_cast<int>(*n) : 0;
+}
+
+void GreyByMask(grid::FlexGrid& g, int row, int mask) {
+  if (!(mask & 4)) g.CellBackColorAt(row, 2, grid::kGrey);
+  if (!(mask & 2)) g.CellBackColorAt(row, 3, grid::kGrey);
+  if (!(mask & 1)) g.CellBackColorAt(row, 4, grid::kGrey);
+}
+
+bool Contains(const std::string& haystackUpper, const std::string& needleUpper) {
+  return haystackUpper.find(needleUpper) != std::string::npos;
+}
+
+} // namespace
+
+void frmLabour::LoadScheduleItems(long scheduleNo, const std::string& firstId,
+                                  const std::string& secondId, const std::string& bodyId,
+                                  int16_t gridIndex) {
+  forms::FlexGrid& g = FGLabourItems(gridIndex);
+  if (g.Rows() > 2) return; // filled already in this session
+
+  data::RecordsetPtr rs;
+  data::Catalogue()->GetLabourItems(rs, scheduleNo, firstId, secondId, bodyId);
+
+  g.Redraw(false);
+  while (!rs->Eof()) {
+    const int mask = rs->Collect("allow_tick").ToInt32();
+    const std::string rr = (mask & 4) ? CatalogueHours(rs->Collect("rrhour")) : std::string();
+    const std::string pt = (mask & 1) ? CatalogueHours(rs->Collect("pthour")) : std::string();
+    g.AddItem(rs->Collect("ItemNo").ToText() + '\t' + text::Trim(rs->Collect("Script").ToText()) +
+              '\t' + rr + "\t\t" + pt + '\t' + std::to_string(mask));
+    const int last = g.Rows() - 1;
+    g.Row(last);
+    GreyByMask(g, last, mask);
+    rs->MoveNext();
+  }
+  if (g.Rows() > 11) g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - 240);
+  if (g.Rows() > 2) g.RemoveItem(1);
+  g.Redraw(true);
+  if (rs->State() == data::adStateOpen) rs->Close();
+}
+
+void frmLabour::FindCatalogueItemRow(int gridIndex, long& row) {
+  const grid::FlexGrid& src = FGLabourItems(gridIndex);
+  const std::string item = src.TextMatrix(src.Row(), col::kItemNo);
+  const std::string desc = text::UCase(src.TextMatrix(src.Row(), col::kDescription));
+  row = 0;
+  for (int r = 1; r < FGSelectedLabour.Rows(); ++r) {
+    if (text::UCase(FGSelectedLabour.TextMatrix(r, col::kDescription)) == desc &&
+        FGSelectedLabour.TextMatrix(r, col::kItemNo) == item) {
+      row = r;
+      return;
+    }
+  }
+}
+
+void frmLabour::FindSearchItemRow(long& row) {
+  const std::string item = fgSearch.TextMatrix(fgSearch.Row(), col::kItemNo);
+  const std::string desc = fgSearch.TextMatrix(fgSearch.Row(), col::kDescription);
+  row = 0;
+  for (int r = 1; r < FGSelectedLabour.Rows(); ++r) {
+    if (FGSelectedLabour.TextMatrix(r, col::kDescription) == desc &&
+        FGSelectedLabour.TextMatrix(r, col::kItemNo) == item) {
+      row = r;
+      return;
+    }
+  }
+}
+
+void frmLabour::AddFromSourceGrid(forms::FlexGrid& source,
+                                  const std::function<void(long&)>& findRow) {
+  grid::FlexGrid& sel = FGSelectedLabour;
+  const int r = source.Row();
+  const int c = source.Col();
+  if (IsGrey(source, r, c)) return;
+  auto G = [&](int column) { return source.TextMatrix(r, column); };
+
+  long found = 0;
+  findRow(found);
+  int mask = 0;
+  if (found > 0) {
+    sel.Row(static_cast<int>(found));
+    mask = MaskOf(sel.TextMatrix(static_cast<int>(found), col::kAllow));
+  } else {
+    mask = MaskOf(G(5));
+    const bool whole = c == 0 || c == 1;
+    std::string rr, ra, pt, rate = kNoRate;
+    if (whole) {
+      rr = G(2), ra = G(3), pt = G(4);
+      if (mask & 4) rate = kDefaultRate;
+    } else if (c >= 2 && c <= 4) {
+      if (c == 2) rr = G(2), rate = kDefaultRate;
+      if (c == 3) ra = G(3);
+      if (c == 4) pt = G(4);
+    }
+    const std::string fields[] = {G(0), G(1),      rr,        kUnticked, ra,        kUnticked,
+                                  pt,   kUnticked, kUnticked, rate,      kUnticked, G(5)};
+    std::string rowText;
+    for (const std::string& f : fields)
+      rowText += f + '\t';
+    sel.AddItem(rowText);
+    FormatFlagCells(sel.Rows() - 1);
+    if (sel.Rows() == 3 && text::Trim(sel.TextMatrix(1, col::kItemNo)).empty()) sel.RemoveItem(1);
+    if (sel.Rows() == 12) sel.ColWidth(col::kDescription, sel.ColWidth(col::kDescription) - 240);
+  }
+
+  const int cur = sel.Row();
+  if (!(mask & 4))
+    for (int k : {col::kRRHours, col::kRRReport})
+      sel.CellBackColorAt(cur, k, grid::kGrey);
+  if (!(mask & 2))
+    for (int k : {col::kRAHours, col::kRAReport})
+      sel.CellBackColorAt(cur, k, grid::kGrey);
+  if (!(mask & 1))
+    for (int k : {col::kPTHours, col::kPTReport, col::kBlend})
+      sel.CellBackColorAt(cur, k, grid::kGrey);
+
+  const bool described = !G(1).empty();
+  int target = col::kItemNo;
+  switch (c) {
+  case 0:
+  case 1:
+    target = described ? col::kRAHours : col::kDescription;
+    break;
+  case 2:
+    if (sel.TextMatrix(cur, col::kRRHours).empty()) sel.TextMatrix(cur, col::kRRHours, G(2));
+    if (sel.TextMatrix(cur, col::kRate) == kNoRate) sel.TextMatrix(cur, col::kRate, kDefaultRate);
+    target = described ? col::kRRHours : col::kDescription;
+    break;
+  case 3:
+    if (sel.TextMatrix(cur, col::kRAHours).empty()) sel.TextMatrix(cur, col::kRAHours, G(3));
+    target = described ? col::kRAHours : col::kDescription;
+    break;
+  case 4:
+    if (sel.TextMatrix(cur, col::kPTHours).empty()) sel.TextMatrix(cur, col::kPTHours, G(4));
+    target = described ? col::kPTHours : col::kDescription;
+    break;
+  default:
+    target = col::kItemNo;
+    break;
+  }
+  sel.Col(target);
+  if (IsGrey(sel, sel.Row(), sel.Col())) sel.Col(col::kDescription);
+  OpenCellEditor(true);
+}
+
+void frmLabour::SearchLabourItems() {
+  int k = 0;
+  for (int i = 0; i < optSchedule.Count(); ++i) {
+    if (optSchedule(i).Value()) {
+      k = i;
+      break;
+    }
+  }
+  const std::string wanted = text::Trim(txtSearch.Text());
+  if (wanted.empty()) return;
+  const std::string needle = text::UCase(wanted);
+
+  fgSearch.Visible(false);
+  fgSearch.AddItem("\t\t\t\t", 1);
+  while (fgSearch.Rows() > 2)
+    fgSearch.RemoveItem(fgSearch.Rows() - 1);
+  LayoutSearchGrid();
+
+  const grid::FlexGrid& cat = FGLabourItems(k);
+  fgSearch.Redraw(false);
+  for (int i = 1; i < cat.Rows(); ++i) {
+    if (!Contains(text::UCase(cat.TextView(i, col::kItemNo)), needle) &&
+        !Contains(text::UCase(cat.TextView(i, col::kDescription)), needle))
+      continue;
+    std::string rowText;
+    for (int c = 0; c <= 5; ++c)
+      rowText += std::string(cat.TextView(i, c)) + '\t';
+    rowText += std::to_string(i);
+    fgSearch.AddItem(rowText);
+    const int last = fgSearch.Rows() - 1;
+    fgSearch.Row(last);
+    GreyByMask(fgSearch, last, MaskOf(fgSearch.TextMatrix(last, 5)));
+  }
+  fgSearch.Redraw(true);
+
+  if (fgSearch.Rows() < 3) {
+    forms::MsgBox("No labour record found", forms::msgbox::kCritical, "Labour item search");
+    return;
+  }
+  fgSearch.RemoveItem(1);
+  if (fgSearch.Rows() >= 11)
+    fgSearch.ColWidth(col::kDescription, fgSearch.ColWidth(col::kDescription) - 240);
+  fgSearch.ZOrder(0);
+  fgSearch.Visible(true);
+  cmdBrowse.Enabled(true);
+  Label1.Caption("Labour Search Result");
+}
+
+void frmLabour::FGLabourItems_Click(int index) {
+  FGLabourItems(index).ToolTipText(FGLabourItems(index).Text());
+}
+
+void frmLabour::FGLabourItems_GotFocus(int /*index*/) { T1.Visible(false); }
+
+void frmLabour::FGLabourItems_DblClick(int index) {
+  AddFromSourceGrid(FGLabourItems(index),
+                    [this, index](long& row) { FindCatalogueItemRow(index, row); });
+}
+
+void frmLabour::fgSearch_DblClick() {
+  AddFromSourceGrid(fgSearch, [this](long& row) { FindSearchItemRow(row); });
+}
+
+void frmLabour::txtSearch_KeyPress(int& keyAscii) {
+  if (keyAscii == 13) SearchLabourItems();
+}
+
+void frmLabour::txtSearch_GotFocus() {
+  txtSearch.BackColor(grid::kYellow);
+  txtSearch.SelStart(0);
+  txtSearch.SelLength(txtSearch.Length());
+}
+
+void frmLabour::txtSearch_LostFocus() { txtSearch.BackColor(grid::kCyan); }
+
+void frmLabour::cmdBrowse_Click() {
+  cmdBrowse.Enabled(false);
+  Label1.Caption("Available Labour Item");
+  fgSearch.Visible(false);
+}
+
+} // namespace belvane::labour
