@@ -1,5 +1,7 @@
 #include "data/quote_store.hpp"
 
+#include "data/sqlite/sqlite_db.hpp"
+
 #include "text/error.hpp"
 
 #include <sqlite3.h>
@@ -43,87 +45,12 @@ constexpr std::array<ItemField, 21> kItemFields{{
     {"unitcost", DataType::Double, "REAL"},
 }};
 
-[[noreturn]] void Fail(sqlite3* db, const std::string& what) {
-  throw Error(err::kDataService, what + ": " + (db ? sqlite3_errmsg(db) : "out of memory"),
-              kSource);
+using sqlite::Statement;
+
+double DoubleAt(const Statement& st, int i) {
+  Value v = st.Column(i);
+  return v.IsNull() ? 0.0 : v.ToDouble();
 }
-
-// A prepared statement that finalizes itself.
-class Stmt {
-public:
-  Stmt(sqlite3* db, const std::string& sql) : db_(db) {
-    if (sqlite3_prepare_v2(db, sql.c_str(), -1, &st_, nullptr) != SQLITE_OK)
-      Fail(db, "Cannot prepare \"" + sql + "\"");
-  }
-  ~Stmt() { sqlite3_finalize(st_); }
-  Stmt(const Stmt&) = delete;
-  Stmt& operator=(const Stmt&) = delete;
-
-  void Bind(int i, const Value& v) {
-    int rc = SQLITE_OK;
-    switch (v.Type()) {
-    case ValueType::Null:
-      rc = sqlite3_bind_null(st_, i);
-      break;
-    case ValueType::Boolean:
-      rc = sqlite3_bind_int(st_, i, v.ToBool() ? 1 : 0);
-      break;
-    case ValueType::Integer:
-    case ValueType::Long:
-      rc = sqlite3_bind_int(st_, i, v.ToInt32());
-      break;
-    case ValueType::Double:
-      rc = sqlite3_bind_double(st_, i, v.ToDouble());
-      break;
-    case ValueType::Text: {
-      const std::string& s = *v.TextIf();
-      rc = sqlite3_bind_text(st_, i, s.data(), static_cast<int>(s.size()), SQLITE_TRANSIENT);
-      break;
-    }
-    }
-    if (rc != SQLITE_OK) Fail(db_, "Cannot bind a value");
-  }
-  void Bind(int i, const std::string& s) { Bind(i, Value(s)); }
-  void Bind(int i, double d) { Bind(i, Value(d)); }
-
-  bool Step() {
-    int rc = sqlite3_step(st_);
-    if (rc == SQLITE_ROW) return true;
-    if (rc == SQLITE_DONE) return false;
-    Fail(db_, "Statement failed");
-  }
-  void Reset() {
-    sqlite3_reset(st_);
-    sqlite3_clear_bindings(st_);
-  }
-
-  Value Column(int i) const {
-    switch (sqlite3_column_type(st_, i)) {
-    case SQLITE_NULL:
-      return Value();
-    case SQLITE_INTEGER: {
-      sqlite3_int64 n = sqlite3_column_int64(st_, i);
-      if (n >= INT32_MIN && n <= INT32_MAX) return Value(static_cast<int32_t>(n));
-      return Value(static_cast<double>(n));
-    }
-    case SQLITE_FLOAT:
-      return Value(sqlite3_column_double(st_, i));
-    default: {
-      const auto* p = reinterpret_cast<const char*>(sqlite3_column_text(st_, i));
-      return Value(std::string(p ? p : "", static_cast<size_t>(sqlite3_column_bytes(st_, i))));
-    }
-    }
-  }
-  std::string Text(int i) const { return Column(i).ToText(); }
-  double Double(int i) const {
-    Value v = Column(i);
-    return v.IsNull() ? 0.0 : v.ToDouble();
-  }
-
-private:
-  sqlite3* db_;
-  sqlite3_stmt* st_ = nullptr;
-};
 
 constexpr const char* kQuoteColumns =
     "qtnno, subquote, customer, vehicle, make, model_id, body_id, sched_type, sched_id, mta_id, "
@@ -131,48 +58,42 @@ constexpr const char* kQuoteColumns =
     "used_markup, recore_markup, aftermarket_markup, old_new_markup, old_used_markup, "
     "old_recore_markup, old_aftermarket_markup";
 
-QuoteHeader ReadHeader(const Stmt& st) {
+QuoteHeader ReadHeader(const Statement& st) {
   QuoteHeader h;
   int i = 0;
-  h.qtnno = st.Text(i++);
-  h.subquote = st.Text(i++);
-  h.customer = st.Text(i++);
-  h.vehicle = st.Text(i++);
-  h.make = st.Text(i++);
-  h.modelId = st.Text(i++);
-  h.bodyId = st.Text(i++);
-  h.schedType = st.Text(i++);
-  h.schedId = st.Text(i++);
-  h.mtaId = st.Text(i++);
-  h.thirdId = st.Text(i++);
-  h.rrRate = st.Double(i++);
-  h.raRate = st.Double(i++);
-  h.ptRate = st.Double(i++);
-  h.defaultSched = st.Double(i++) != 0;
-  h.insurerChanged = st.Double(i++) != 0;
-  h.newMarkup = st.Double(i++);
-  h.usedMarkup = st.Double(i++);
-  h.recoreMarkup = st.Double(i++);
-  h.afterMarketMarkup = st.Double(i++);
-  h.oldNewMarkup = st.Double(i++);
-  h.oldUsedMarkup = st.Double(i++);
-  h.oldRecoreMarkup = st.Double(i++);
-  h.oldAfterMarketMarkup = st.Double(i++);
+  h.qtnno = st.Column(i++).ToText();
+  h.subquote = st.Column(i++).ToText();
+  h.customer = st.Column(i++).ToText();
+  h.vehicle = st.Column(i++).ToText();
+  h.make = st.Column(i++).ToText();
+  h.modelId = st.Column(i++).ToText();
+  h.bodyId = st.Column(i++).ToText();
+  h.schedType = st.Column(i++).ToText();
+  h.schedId = st.Column(i++).ToText();
+  h.mtaId = st.Column(i++).ToText();
+  h.thirdId = st.Column(i++).ToText();
+  h.rrRate = DoubleAt(st, i++);
+  h.raRate = DoubleAt(st, i++);
+  h.ptRate = DoubleAt(st, i++);
+  h.defaultSched = DoubleAt(st, i++) != 0;
+  h.insurerChanged = DoubleAt(st, i++) != 0;
+  h.newMarkup = DoubleAt(st, i++);
+  h.usedMarkup = DoubleAt(st, i++);
+  h.recoreMarkup = DoubleAt(st, i++);
+  h.afterMarketMarkup = DoubleAt(st, i++);
+  h.oldNewMarkup = DoubleAt(st, i++);
+  h.oldUsedMarkup = DoubleAt(st, i++);
+  h.oldRecoreMarkup = DoubleAt(st, i++);
+  h.oldAfterMarketMarkup = DoubleAt(st, i++);
   return h;
 }
 
 } // namespace
 
-QuoteStore::QuoteStore(const std::string& path) : path_(path) {
-  if (sqlite3_open_v2(path.c_str(), &db_, SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE, nullptr) !=
-      SQLITE_OK) {
-    std::string msg = db_ ? sqlite3_errmsg(db_) : "out of memory";
-    sqlite3_close(db_);
-    db_ = nullptr;
-    throw Error(err::kDataService, "Cannot open the quote database \"" + path + "\": " + msg,
-                kSource);
-  }
-  sqlite3_busy_timeout(db_, 5000);
+QuoteStore::QuoteStore(const std::string& path)
+    : db_(std::make_unique<sqlite::Database>(path, sqlite::Database::Mode::Create, "Quote database",
+                                             kSource)),
+      path_(path) {
   Exec("PRAGMA foreign_keys = ON");
   Exec("CREATE TABLE IF NOT EXISTS quotes ("
        "qtnno TEXT PRIMARY KEY, subquote TEXT, customer TEXT, vehicle TEXT, make TEXT, "
@@ -191,19 +112,12 @@ QuoteStore::QuoteStore(const std::string& path) : path_(path) {
   Exec("CREATE INDEX IF NOT EXISTS quote_items_qtnno ON quote_items(qtnno)");
 }
 
-QuoteStore::~QuoteStore() { sqlite3_close(db_); }
+QuoteStore::~QuoteStore() = default;
 
-void QuoteStore::Exec(const char* sql) {
-  char* msg = nullptr;
-  if (sqlite3_exec(db_, sql, nullptr, nullptr, &msg) != SQLITE_OK) {
-    std::string text = msg ? msg : "unknown error";
-    sqlite3_free(msg);
-    throw Error(err::kDataService, "Quote database \"" + path_ + "\": " + text, kSource);
-  }
-}
+void QuoteStore::Exec(const char* sql) { db_->Exec(sql); }
 
 std::vector<QuoteHeader> QuoteStore::ListQuotes() {
-  Stmt st(db_, std::string("SELECT ") + kQuoteColumns + " FROM quotes ORDER BY qtnno");
+  Statement st(*db_, std::string("SELECT ") + kQuoteColumns + " FROM quotes ORDER BY qtnno");
   std::vector<QuoteHeader> out;
   while (st.Step())
     out.push_back(ReadHeader(st));
@@ -211,24 +125,24 @@ std::vector<QuoteHeader> QuoteStore::ListQuotes() {
 }
 
 std::optional<QuoteHeader> QuoteStore::GetQuote(const std::string& qtnno) {
-  Stmt st(db_, std::string("SELECT ") + kQuoteColumns + " FROM quotes WHERE qtnno = ?");
-  st.Bind(1, qtnno);
+  Statement st(*db_, std::string("SELECT ") + kQuoteColumns + " FROM quotes WHERE qtnno = ?");
+  st.BindText(1, qtnno);
   if (!st.Step()) return std::nullopt;
   return ReadHeader(st);
 }
 
 void QuoteStore::SaveQuote(const QuoteHeader& h) {
-  Stmt st(db_, std::string("INSERT OR REPLACE INTO quotes (") + kQuoteColumns +
-                   ") VALUES (?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?)");
+  Statement st(*db_, std::string("INSERT OR REPLACE INTO quotes (") + kQuoteColumns +
+                         ") VALUES (?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?)");
   int i = 1;
   for (const std::string* s : {&h.qtnno, &h.subquote, &h.customer, &h.vehicle, &h.make, &h.modelId,
                                &h.bodyId, &h.schedType, &h.schedId, &h.mtaId, &h.thirdId})
-    st.Bind(i++, *s);
+    st.BindText(i++, *s);
   for (double d :
        {h.rrRate, h.raRate, h.ptRate, h.defaultSched ? 1.0 : 0.0, h.insurerChanged ? 1.0 : 0.0,
         h.newMarkup, h.usedMarkup, h.recoreMarkup, h.afterMarketMarkup, h.oldNewMarkup,
         h.oldUsedMarkup, h.oldRecoreMarkup, h.oldAfterMarketMarkup})
-    st.Bind(i++, d);
+    st.Bind(i++, Value(d));
   st.Step();
 }
 
@@ -252,8 +166,8 @@ RecordsetPtr QuoteStore::LoadItems(const std::string& qtnno, ItemKind kind) {
   // A labour line's records stay together in R&R, RA, PAINT order.
   sql += " ORDER BY itemno, script, CASE Category WHEN 'R&R' THEN 0 WHEN 'RA' THEN 1 "
          "WHEN 'PAINT' THEN 2 ELSE 3 END, ITEMID";
-  Stmt st(db_, sql);
-  st.Bind(1, qtnno);
+  Statement st(*db_, sql);
+  st.BindText(1, qtnno);
   auto rs = NewItemRecordset();
   while (st.Step()) {
     std::vector<Value> values;
@@ -300,9 +214,9 @@ SaveSummary QuoteStore::SaveItems(const std::string& qtnno, Recordset& items) {
   std::vector<std::pair<size_t, int32_t>> assigned;
   Exec("BEGIN IMMEDIATE");
   try {
-    Stmt insert(db_, insertSql), update(db_, updateSql);
-    Stmt remove(db_, "DELETE FROM quote_items WHERE ITEMID = ? AND qtnno = ?");
-    auto bindFields = [&](Stmt& st, size_t rec) {
+    Statement insert(*db_, insertSql), update(*db_, updateSql);
+    Statement remove(*db_, "DELETE FROM quote_items WHERE ITEMID = ? AND qtnno = ?");
+    auto bindFields = [&](Statement& st, size_t rec) {
       for (size_t i = 1; i < kItemFields.size(); ++i) {
         Value v = items.StoredValue(rec, fieldOf[i]);
         if (i == 3) v = Value(qtnno); // the quote the items belong to
@@ -318,7 +232,7 @@ SaveSummary QuoteStore::SaveItems(const std::string& qtnno, Recordset& items) {
         bindFields(insert, rec);
         insert.Step();
         insert.Reset();
-        assigned.emplace_back(rec, static_cast<int32_t>(sqlite3_last_insert_rowid(db_)));
+        assigned.emplace_back(rec, static_cast<int32_t>(sqlite3_last_insert_rowid(db_->Handle())));
         ++summary.inserted;
         break;
       case RecordStatus::Modified: {
@@ -328,7 +242,8 @@ SaveSummary QuoteStore::SaveItems(const std::string& qtnno, Recordset& items) {
           bindFields(insert, rec);
           insert.Step();
           insert.Reset();
-          assigned.emplace_back(rec, static_cast<int32_t>(sqlite3_last_insert_rowid(db_)));
+          assigned.emplace_back(rec,
+                                static_cast<int32_t>(sqlite3_last_insert_rowid(db_->Handle())));
           ++summary.inserted;
           break;
         }
@@ -336,7 +251,7 @@ SaveSummary QuoteStore::SaveItems(const std::string& qtnno, Recordset& items) {
         update.Bind(static_cast<int>(kItemFields.size()), id);
         update.Bind(static_cast<int>(kItemFields.size()) + 1, Value(qtnno));
         update.Step();
-        if (sqlite3_changes(db_) != 1)
+        if (sqlite3_changes(db_->Handle()) != 1)
           throw Error(err::kDataService,
                       "Quote item " + id.ToText() + " of quote " + qtnno +
                           " is no longer in the database",
@@ -359,7 +274,7 @@ SaveSummary QuoteStore::SaveItems(const std::string& qtnno, Recordset& items) {
     }
     Exec("COMMIT");
   } catch (...) {
-    sqlite3_exec(db_, "ROLLBACK", nullptr, nullptr, nullptr);
+    sqlite3_exec(db_->Handle(), "ROLLBACK", nullptr, nullptr, nullptr);
     throw;
   }
   for (auto [rec, id] : assigned)

@@ -6,13 +6,16 @@
 
 #include "data/recordset.hpp"
 
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
 
-struct sqlite3;
-
 namespace belvane::data {
+
+namespace sqlite {
+class Database;
+}
 
 // The context of a quote that the editors are opened with.
 struct QuoteHeader {
@@ -74,7 +77,7 @@ public:
 
 private:
   void Exec(const char* sql);
-  sqlite3* db_ = nullptr;
+  std::unique_ptr<sqlite::Database> db_;
   std::string path_;
 };
 

@@ -39,7 +39,8 @@ long NumberFor(int rc, std::string_view message) {
 
 } // namespace
 
-Database::Database(std::string path, Mode mode) : path_(std::move(path)) {
+Database::Database(std::string path, Mode mode, std::string label, std::string source)
+    : path_(std::move(path)), label_(std::move(label)), source_(std::move(source)) {
   namespace fs = std::filesystem;
   std::error_code ec;
   if (mode != Mode::Create) {
@@ -97,7 +98,7 @@ void Database::Fail(int rc, std::string_view context) const {
 }
 
 void Database::Fail(long number, std::string_view what) const {
-  throw Error(number, "Catalogue " + path_ + ": " + std::string(what), kSource);
+  throw Error(number, label_ + " " + path_ + ": " + std::string(what), source_);
 }
 
 void Database::Exec(std::string_view sql) {

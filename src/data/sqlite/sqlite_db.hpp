@@ -26,7 +26,10 @@ public:
     Create     // created when missing
   };
 
-  Database(std::string path, Mode mode);
+  // `label` names the kind of database in error descriptions ("Catalogue
+  // <file>: ..."), `source` is the errors' source.
+  Database(std::string path, Mode mode, std::string label = "Catalogue",
+           std::string source = kSource);
   ~Database();
   Database(const Database&) = delete;
   Database& operator=(const Database&) = delete;
@@ -49,6 +52,8 @@ public:
 private:
   sqlite3* db_ = nullptr;
   std::string path_;
+  std::string label_;
+  std::string source_;
 };
 
 class Statement {
