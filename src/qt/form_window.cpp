@@ -1,0 +1,294 @@
+#include "qt/form_window.hpp"
+
+#include "forms/controls.hpp"
+#include "forms/form.hpp"
+#include "forms/input.hpp"
+#include "forms/simulated_user.hpp"
+#include "qt/control_view.hpp"
+#include "qt/keymap.hpp"
+#include "qt/qt_runtime.hpp"
+#include "qt/views.hpp"
+
+#include <QApplication>
+#include <QClipboard>
+#include <QCloseEvent>
+#include <QElapsedTimer>
+#include <QEventLoop>
+#include <QKeyEvent>
+#include <QPointer>
+#include <QRegularExpression>
+#include <QScreen>
+#include <QTimer>
+#include <QWindow>
+
+#include <algorithm>
+#include <vector>
+
+namespace belvane::qt {
+
+namespace {
+// How long a modeless window may take to come on screen before the caller
+// goes on regardless.
+constexpr int kExposeWaitMs = 1000;
+} // namespace
+
+FormWindow::FormWindow(QtRuntime& runtime, forms::Form& form, const Scale& scale)
+    : QDialog(nullptr, Qt::Dialog | Qt::WindowTitleHint | Qt::WindowSystemMenuHint |
+                           Qt::WindowCloseButtonHint | Qt::MSWindowsFixedSizeDialogHint),
+      runtime_(runtime), form_(&form), scale_(scale) {
+  setObjectName(QString::fromStdString(form.Name()));
+  setFocusPolicy(Qt::NoFocus);
+  setContextMenuPolicy(Qt::NoContextMenu);
+  setSizeGripEnabled(false);
+  installEventFilter(this);
+  for (forms::Control* control : form.Controls())
+    MakeView(*control);
+  for (auto& [control, view] : views_)
+    view->SyncAll();
+  ApplyGeometry();
+  ApplyFont();
+  setWindowTitle(ToQString(form.Caption()));
+  Restack();
+  FollowFocus();
+  form.AddObserver(this);
+}
+
+FormWindow::~FormWindow() {
+  if (form_) form_->RemoveObserver(this);
+  if (loop_) loop_->quit();
+}
+
+ControlView* FormWindow::MakeView(forms::Control& control) {
+  if (auto it = views_.find(&control); it != views_.end()) return it->second;
+  if (control.Container()) MakeView(*control.Container());
+  ControlView* view = MakeControlView(*this, control, ContainerWidget(control));
+  views_[&control] = view;
+  return view;
+}
+
+ControlView* FormWindow::ViewOf(const forms::Control& control) const {
+  const auto it = views_.find(&control);
+  return it == views_.end() ? nullptr : it->second;
+}
+
+QWidget* FormWindow::WidgetOf(const forms::Control& control) const {
+  ControlView* view = ViewOf(control);
+  return view ? view->Widget() : nullptr;
+}
+
+QWidget* FormWindow::ContainerWidget(const forms::Control& control) const {
+  if (control.Container())
+    if (QWidget* frame = WidgetOf(*control.Container())) return frame;
+  return const_cast<FormWindow*>(this);
+}
+
+// ---- geometry and look ----
+
+void FormWindow::ApplyGeometry() {
+  if (!form_) return;
+  setFixedSize(scale_.Pixels(form_->ScaleWidth()), scale_.Pixels(form_->ScaleHeight()));
+  if (placed_ && (form_->Left() != 0 || form_->Top() != 0))
+    move(scale_.Pixels(form_->Left()), scale_.Pixels(form_->Top()));
+}
+
+void FormWindow::ApplyFont() {
+  if (form_) setFont(ToQFont(form_->FontName(), form_->FontSize(), false, false));
+}
+
+// A form placed by its design goes there; one at the origin is centred over
+// the window it belongs to, or on the screen.
+void FormWindow::Place() {
+  if (placed_ || !form_) return;
+  placed_ = true;
+  if (form_->Left() != 0 || form_->Top() != 0) {
+    move(scale_.Pixels(form_->Left()), scale_.Pixels(form_->Top()));
+    return;
+  }
+  QRect area;
+  if (const QWidget* over = QApplication::activeWindow(); over && over != this)
+    area = over->frameGeometry();
+  else if (const QScreen* screen = QGuiApplication::primaryScreen())
+    area = screen->availableGeometry();
+  if (area.isValid()) move(area.center() - QPoint(width() / 2, height() / 2));
+}
+
+void FormWindow::Restack() {
+  if (!form_) return;
+  // Siblings by their models' z-order; equal keys keep the declaration order.
+  std::vector<std::pair<forms::Control*, std::size_t>> order;
+  const auto& controls = form_->Controls();
+  for (std::size_t i = 0; i < controls.size(); ++i)
+    order.emplace_back(controls[i], i);
+  std::stable_sort(order.begin(), order.end(), [](const auto& a, const auto& b) {
+    return a.first->Model().ZOrderKey() < b.first->Model().ZOrderKey();
+  });
+  for (const auto& [control, index] : order)
+    if (QWidget* widget = WidgetOf(*control)) widget->raise();
+}
+
+// ---- focus ----
+
+void FormWindow::ParkFocus() { setFocus(Qt::OtherFocusReason); }
+
+void FormWindow::FollowFocus() {
+  if (!form_) return;
+  forms::Control* active = form_->ActiveControl();
+  QWidget* widget = active ? WidgetOf(*active) : nullptr;
+  if (widget && widget->isEnabled() && !widget->isHidden()) {
+    if (!widget->hasFocus()) widget->setFocus(Qt::OtherFocusReason);
+    return;
+  }
+  const QWidget* focused = focusWidget();
+  if (focused && focused != this) ParkFocus();
+}
+
+// ---- showing ----
+
+void FormWindow::ShowModeless() {
+  Place();
+  show();
+  raise();
+  activateWindow();
+  // The window should paint before the caller goes on (a status box shown
+  // while an editor loads): wait until the window system shows it.
+  QElapsedTimer waited;
+  waited.start();
+  while (isVisible() && windowHandle() && !windowHandle()->isExposed() &&
+         waited.elapsed() < kExposeWaitMs)
+    QCoreApplication::processEvents(QEventLoop::ExcludeUserInputEvents, 10);
+  if (isVisible()) repaint();
+}
+
+void FormWindow::RunModal(const std::function<void()>& shown) {
+  Place();
+  setWindowModality(Qt::ApplicationModal);
+  QWidget* over = QApplication::activeModalWidget();
+  if (!over) over = QApplication::activeWindow();
+  if (over && over != this) {
+    winId(); // the window's native handle, to name the window it belongs to
+    if (over->windowHandle()) windowHandle()->setTransientParent(over->windowHandle());
+  }
+  show();
+  raise();
+  activateWindow();
+  QPointer<FormWindow> self(this);
+  QEventLoop loop;
+  loop_ = &loop;
+  if (shown) QTimer::singleShot(0, &loop, shown);
+  if (form_ && form_->Visible()) loop.exec(QEventLoop::DialogExec);
+  if (!self) return;
+  loop_ = nullptr;
+  if (!isVisible()) setWindowModality(Qt::NonModal);
+}
+
+void FormWindow::FormHidden() {
+  if (isVisible()) {
+    ParkFocus();
+    hide();
+  }
+  setWindowModality(Qt::NonModal);
+  if (loop_) loop_->quit();
+}
+
+// ---- the form's notices ----
+
+void FormWindow::PropertyChanged(grid::Property property) {
+  if (!form_) return;
+  switch (property) {
+  case grid::Property::Visible:
+    if (!form_->Visible()) FormHidden();
+    break;
+  case grid::Property::Caption:
+    setWindowTitle(ToQString(form_->Caption()));
+    break;
+  case grid::Property::Geometry:
+    ApplyGeometry();
+    break;
+  case grid::Property::Font:
+    ApplyFont();
+    break;
+  case grid::Property::ZOrder:
+    if (isVisible()) raise();
+    break;
+  default:
+    break;
+  }
+}
+
+void FormWindow::RepaintRequested() {
+  if (isVisible()) repaint();
+}
+
+void FormWindow::ModelDestroyed() {
+  form_ = nullptr;
+  runtime_.Forget(*this);
+  if (loop_) loop_->quit();
+  hide();
+  deleteLater();
+}
+
+// ---- input ----
+
+void FormWindow::closeEvent(QCloseEvent* event) {
+  // The form decides: the close box unloads it (unless it cancels), and the
+  // window hides when the form does.
+  event->ignore();
+  if (form_ && form_->Visible()) forms::Input::CloseBox(*form_);
+}
+
+bool FormWindow::eventFilter(QObject* watched, QEvent* event) {
+  if (watched == this && (event->type() == QEvent::KeyPress || event->type() == QEvent::KeyRelease))
+    return ForwardKey(static_cast<QKeyEvent*>(event));
+  return QDialog::eventFilter(watched, event);
+}
+
+bool FormWindow::ForwardKey(QKeyEvent* event) {
+  // Keys reach only the form that takes the keyboard now.
+  if (!form_ || forms::Input::ActiveForm() != form_) return true;
+  const KeyStroke key = FromQtKey(*event);
+  if (event->type() == QEvent::KeyRelease) {
+    if (!event->isAutoRepeat() && key.keyCode != 0) forms::Input::KeyUp(key.keyCode, key.shift);
+    return true;
+  }
+  if (key.keyCode != 0) forms::Input::KeyDown(key.keyCode, key.shift, key.character);
+  Clipboard(event);
+  return true;
+}
+
+// The clipboard keys of a focused text box. Copy takes the model's
+// selection; paste types the clipboard's first line as keys, so the form's
+// key handlers see (and may refuse) each character, as they do typing.
+bool FormWindow::Clipboard(QKeyEvent* event) {
+  if (!form_) return false;
+  auto* box = dynamic_cast<forms::TextBox*>(form_->ActiveControl());
+  if (!box || !forms::Input::Accepts(*box)) return false;
+  QClipboard* clipboard = QGuiApplication::clipboard();
+  if (event->matches(QKeySequence::Copy)) {
+    if (box->SelLength() > 0) clipboard->setText(ToQString(box->SelText()));
+    return true;
+  }
+  if (event->matches(QKeySequence::Cut)) {
+    if (box->SelLength() == 0) return true;
+    clipboard->setText(ToQString(box->SelText()));
+    if (!box->Locked()) RunHandler(ControlName(*box) + "_Change", [box] { box->SelText(""); });
+    return true;
+  }
+  if (event->matches(QKeySequence::Paste)) {
+    if (!box->Locked()) TypeText(clipboard->text());
+    return true;
+  }
+  if (event->matches(QKeySequence::SelectAll)) {
+    box->SelStart(0);
+    box->SelLength(box->Length());
+    return true;
+  }
+  return false;
+}
+
+void FormWindow::TypeText(const QString& text) {
+  QString line = text.section(QRegularExpression(QStringLiteral("[\\r\\n]")), 0, 0);
+  line.replace(u'\t', u' ');
+  if (!line.isEmpty()) forms::SimulatedUser().Type(ToUtf8(line));
+}
+
+} // namespace belvane::qt
