@@ -162,11 +162,19 @@ void FormWindow::ShowModeless() {
 void FormWindow::RunModal(const std::function<void()>& shown) {
   Place();
   setWindowModality(Qt::ApplicationModal);
+  // The window belongs to the window it opens over: the modal one in front,
+  // else the host's active window (never a modeless form of ours, such as a
+  // status box that goes away while this window is open).
   QWidget* over = QApplication::activeModalWidget();
-  if (!over) over = QApplication::activeWindow();
+  if (!over) {
+    over = QApplication::activeWindow();
+    if (auto* form = qobject_cast<FormWindow*>(over); form && !form->isModal()) over = nullptr;
+  }
   if (over && over != this) {
     winId(); // the window's native handle, to name the window it belongs to
     if (over->windowHandle()) windowHandle()->setTransientParent(over->windowHandle());
+  } else if (windowHandle()) {
+    windowHandle()->setTransientParent(nullptr);
   }
   show();
   raise();
