@@ -8,11 +8,12 @@ function(belvane_layer name)
   target_include_directories(belvane_${name} PUBLIC
     $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/src>
     $<INSTALL_INTERFACE:include/belvane/internal>)
-  target_link_libraries(belvane_${name} PUBLIC ${L_DEPENDS} PRIVATE belvane_warnings ${L_PRIVATE_DEPENDS})
+  target_link_libraries(belvane_${name} PUBLIC ${L_DEPENDS}
+                        PRIVATE $<BUILD_INTERFACE:belvane_warnings> ${L_PRIVATE_DEPENDS})
   set_property(GLOBAL APPEND PROPERTY BELVANE_LAYERS belvane_${name})
   install(TARGETS belvane_${name} EXPORT BelvaneTargets ARCHIVE DESTINATION lib)
   install(DIRECTORY ${CMAKE_CURRENT_SOURCE_DIR}/ DESTINATION include/belvane/internal/${name}
-          FILES_MATCHING PATTERN "*.hpp")
+          FILES_MATCHING PATTERN "*.hpp" PATTERN "tools" EXCLUDE)
 endfunction()
 
 # belvane_test(<name> SOURCES ... DEPENDS ...)

@@ -57,7 +57,7 @@ if(_qt_components)
   string(APPEND BELVANE_FIND_DEPENDENCIES "find_dependency(Qt6 COMPONENTS ${_qt_components})\n")
 endif()
 
-install(TARGETS belvane_component belvane_warnings EXPORT BelvaneTargets)
+install(TARGETS belvane_component EXPORT BelvaneTargets)
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/belvane DESTINATION include)
 install(EXPORT BelvaneTargets NAMESPACE Belvane:: DESTINATION lib/cmake/Belvane)
 configure_package_config_file(${PROJECT_SOURCE_DIR}/cmake/BelvaneConfig.cmake.in

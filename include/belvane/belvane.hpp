@@ -2,7 +2,8 @@
 // The one header a host includes: CForms and the editing modes, the record
 // set the host passes to the editors, the catalogue a host points the
 // editors at, the field key a deployment may set, the runtime seam (the
-// headless runtime; a desktop host installs the Qt runtime), and the quote
+// headless runtime and the simulated user that plays scripted sessions; a
+// desktop host installs the Qt runtime), and the quote
 // store a host may keep its quotes in.
 
 #include "cipher/field.hpp"
@@ -10,6 +11,10 @@
 #include "data/quote_store.hpp"
 #include "data/recordset.hpp"
 #include "data/value.hpp"
+#include "forms/controls.hpp"
+#include "forms/form.hpp"
+#include "forms/keys.hpp"
 #include "forms/runtime.hpp"
+#include "forms/simulated_user.hpp"
 #include "host/cforms.hpp"
 #include "text/error.hpp"
