@@ -207,6 +207,9 @@ void frmLabour::SetQuoteNo(data::RecordsetPtr& prsLab, std::string& psSchedType,
                            const std::string& psMTAID, const std::string& psThirdID,
                            double pdRRRate, double pdRARate, double pdPTRate, bool pbDefaultSched,
                            bool pbInsurerChanged, EQuoteEditMode peMode) {
+  if (!prsLab)
+    throw Error(err::kInvalidCall, "The labour editor was given no quote item record set",
+                "frmLabour.SetQuoteNo");
   host::frmStatus& status = host::StatusBox();
   status.ShowStatusBox("Opening Labour...");
   // The status box goes when the session ends, also when it ends in an

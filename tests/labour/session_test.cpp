@@ -177,6 +177,20 @@ TEST_F(SessionTest, ALoadErrorIsReportedAndTheEditorStillOpens) {
   EXPECT_NE(m.prompt.find("\r\nSource: "), std::string::npos);
 }
 
+TEST_F(SessionTest, NoRecordSetIsRefusedBeforeAnythingOpens) {
+  quote.reset();
+  try {
+    Open(eEdit);
+    ADD_FAILURE() << "opened without a record set";
+  } catch (const belvane::Error& e) {
+    EXPECT_EQ(e.Number(), belvane::err::kInvalidCall);
+  }
+  EXPECT_FALSE(host::StatusBox().Loaded());
+  EXPECT_FALSE(host::gbLabourFormLoaded);
+  EXPECT_EQ(forms::Screen.MousePointer(), 0);
+  runtime.Reset(); // the queued script was never played
+}
+
 TEST_F(SessionTest, SessionsReuseOneFormAndStartAfresh) {
   frmLabour* first = nullptr;
   Open(eEdit, [&](frmLabour& f) {
