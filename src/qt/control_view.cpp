@@ -187,10 +187,13 @@ void ControlView::ApplyFont() {
 }
 
 void ControlView::ApplyColors() {
+  // The model's fore colour for an enabled control; a disabled one keeps the
+  // style's grey.
   QPalette palette = widget_->palette();
-  palette.setColor(QPalette::WindowText, ToQColor(model_->ForeColor()));
-  palette.setColor(QPalette::Text, ToQColor(model_->ForeColor()));
-  palette.setColor(QPalette::ButtonText, ToQColor(model_->ForeColor()));
+  const QColor fore = ToQColor(model_->ForeColor());
+  for (const auto group : {QPalette::Active, QPalette::Inactive})
+    for (const auto role : {QPalette::WindowText, QPalette::Text, QPalette::ButtonText})
+      palette.setColor(group, role, fore);
   widget_->setPalette(palette);
 }
 

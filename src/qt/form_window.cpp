@@ -114,12 +114,19 @@ void FormWindow::Place() {
 
 void FormWindow::Restack() {
   if (!form_) return;
-  // Siblings by their models' z-order; equal keys keep the declaration order.
+  // Labels are drawn on their container itself, beneath every control that
+  // has a window of its own (a label under a grid shows only while the grid
+  // is hidden); among themselves, and among the others, siblings stack by
+  // their models' z-order, equal keys in the order of declaration.
   std::vector<std::pair<forms::Control*, std::size_t>> order;
   const auto& controls = form_->Controls();
   for (std::size_t i = 0; i < controls.size(); ++i)
     order.emplace_back(controls[i], i);
-  std::stable_sort(order.begin(), order.end(), [](const auto& a, const auto& b) {
+  const auto layer = [](const forms::Control* c) {
+    return c->Kind() == forms::ControlKind::Label ? 0 : 1;
+  };
+  std::stable_sort(order.begin(), order.end(), [&layer](const auto& a, const auto& b) {
+    if (layer(a.first) != layer(b.first)) return layer(a.first) < layer(b.first);
     return a.first->Model().ZOrderKey() < b.first->Model().ZOrderKey();
   });
   for (const auto& [control, index] : order)

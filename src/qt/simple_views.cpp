@@ -318,7 +318,8 @@ void TextBoxView::TakeUserSelection() {
 void TextBoxView::ApplyColors() {
   QPalette palette = edit_->palette();
   palette.setColor(QPalette::Base, ToQColor(box_.BackColor()));
-  palette.setColor(QPalette::Text, ToQColor(box_.ForeColor()));
+  for (const auto group : {QPalette::Active, QPalette::Inactive})
+    palette.setColor(group, QPalette::Text, ToQColor(box_.ForeColor()));
   edit_->setPalette(palette);
 }
 

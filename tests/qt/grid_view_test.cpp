@@ -48,6 +48,15 @@ TEST_F(QtFormsTest, TheGridDrawsTheModelsTextsGeometryAndLook) {
     EXPECT_EQ(cells->index(0, 1).data(Qt::BackgroundRole).value<QBrush>().color(),
               QColor(Qt::yellow)); // the focused grid's current cell
 
+    // A label declared after the grid still lies beneath it: it shows only
+    // where the grid is hidden.
+    QWidget* loading = WidgetOf(form.lblLoading);
+    const QPoint under = loading->mapTo(loading->window(), loading->rect().center());
+    EXPECT_TRUE(view->Widget()->isAncestorOf(loading->window()->childAt(under)));
+    grid.Visible(false);
+    EXPECT_EQ(loading->window()->childAt(under), loading);
+    grid.Visible(true);
+
     // A model change shows at once.
     grid.TextMatrix(5, 1, "Boot lid");
     EXPECT_EQ(cells->index(4, 1).data().toString(), "Boot lid");

@@ -34,6 +34,7 @@ public:
   forms::Label lblNote{*this, "lblNote"};
   forms::CheckBox chkAuto{*this, "chkAuto"};
   forms::CommandButton cmdClose{*this, "cmdClose"};
+  forms::Label lblLoading{*this, "lblLoading"}; // beneath the grid
 
   int lineCount = 30;
   std::vector<std::string> written; // what Close wrote back
@@ -99,6 +100,8 @@ protected:
     chkAuto.Move(120, 2950, 2400, 255);
     cmdClose.Caption("Close");
     cmdClose.Move(5900, 3600, 1095, 375);
+    lblLoading.Caption("L O A D I N G . . .");
+    lblLoading.Move(2000, 1000, 2400, 255);
   }
 
   void Form_Load() override {

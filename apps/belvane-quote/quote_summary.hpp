@@ -1,0 +1,47 @@
+#pragma once
+// What the demo host shows of a quote: its labour lines, one per record,
+// and the hours and amounts per category. A line's amount is its hours at
+// its rate (the R&R rate the line carries, else the quote's rate of the
+// category); report-only lines are listed but not charged.
+
+#include "data/quote_store.hpp"
+#include "data/recordset.hpp"
+
+#include <array>
+#include <string>
+#include <vector>
+
+namespace belvane::quote {
+
+enum Category { kRemoveReplace = 0, kRepair = 1, kPaint = 2 };
+inline constexpr std::array<const char*, 3> kCategoryNames{"R&R", "Repair", "Paint"};
+
+struct SummaryLine {
+  std::string itemNo;
+  std::string description;
+  Category category = kRemoveReplace;
+  double hours = 0;
+  double rate = 0;
+  double amount = 0; // 0 for a report-only line
+  bool reportOnly = false;
+};
+
+struct QuoteSummary {
+  std::vector<SummaryLine> lines;
+  std::array<double, 3> hours{};
+  std::array<double, 3> amounts{};
+  double TotalHours() const { return hours[0] + hours[1] + hours[2]; }
+  double TotalAmount() const { return amounts[0] + amounts[1] + amounts[2]; }
+};
+
+// The labour records of `items` that are not deleted, in the record set's
+// order.
+QuoteSummary Summarize(data::Recordset& items, const data::QuoteHeader& quote);
+
+// The quote's labour lines as stored now (empty for no such quote).
+QuoteSummary StoredSummary(data::QuoteStore& store, const std::string& qtnno);
+
+// "2.50" and "1,234.50": hours and amounts as the editors show them.
+std::string Hours(double value);
+
+} // namespace belvane::quote

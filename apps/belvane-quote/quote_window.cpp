@@ -1,0 +1,255 @@
+#include "quote_window.hpp"
+
+#include "data/quote_store.hpp"
+#include "host/cforms.hpp"
+#include "quote_summary.hpp"
+#include "text/error.hpp"
+
+#include <QHBoxLayout>
+#include <QHeaderView>
+#include <QLabel>
+#include <QMessageBox>
+#include <QPushButton>
+#include <QSplitter>
+#include <QStatusBar>
+#include <QTableWidget>
+#include <QVBoxLayout>
+
+namespace belvane::quote {
+
+namespace {
+
+QString Q(const std::string& s) { return QString::fromStdString(s); }
+
+QTableWidget* MakeTable(const QStringList& titles, QWidget* parent) {
+  auto* table = new QTableWidget(0, static_cast<int>(titles.size()), parent);
+  table->setHorizontalHeaderLabels(titles);
+  table->verticalHeader()->hide();
+  table->verticalHeader()->setSectionResizeMode(QHeaderView::Fixed);
+  table->setEditTriggers(QAbstractItemView::NoEditTriggers);
+  table->setSelectionBehavior(QAbstractItemView::SelectRows);
+  table->setSelectionMode(QAbstractItemView::SingleSelection);
+  table->setAlternatingRowColors(true);
+  table->horizontalHeader()->setHighlightSections(false);
+  table->verticalHeader()->setDefaultSectionSize(table->fontMetrics().height() + 8);
+  return table;
+}
+
+QTableWidgetItem* Cell(const QString& text, bool number = false) {
+  auto* item = new QTableWidgetItem(text);
+  if (number) item->setTextAlignment(Qt::AlignRight | Qt::AlignVCenter);
+  return item;
+}
+
+QLabel* Heading(const QString& text, QWidget* parent) {
+  auto* label = new QLabel(text, parent);
+  QFont font = label->font();
+  font.setBold(true);
+  label->setFont(font);
+  return label;
+}
+
+} // namespace
+
+struct QuoteWindow::State {
+  CForms forms;
+  std::vector<data::QuoteHeader> headers;
+};
+
+QuoteWindow::~QuoteWindow() = default;
+
+QuoteWindow::QuoteWindow(data::QuoteStore& store, QWidget* parent)
+    : QMainWindow(parent), store_(store), state_(std::make_unique<State>()) {
+  setObjectName("QuoteWindow");
+  setWindowTitle("Belvane Quote");
+  auto* splitter = new QSplitter(this);
+
+  auto* left = new QWidget(splitter);
+  auto* leftLayout = new QVBoxLayout(left);
+  leftLayout->addWidget(Heading("Quotes", left));
+  quotes_ = MakeTable({"Quote", "Customer", "Vehicle"}, left);
+  quotes_->horizontalHeader()->setStretchLastSection(true);
+  leftLayout->addWidget(quotes_);
+
+  auto* right = new QWidget(splitter);
+  auto* rightLayout = new QVBoxLayout(right);
+  title_ = Heading("", right);
+  QFont big = title_->font();
+  big.setPointSizeF(big.pointSizeF() * 1.3);
+  title_->setFont(big);
+  vehicle_ = new QLabel(right);
+  context_ = new QLabel(right);
+  context_->setWordWrap(true);
+  rightLayout->addWidget(title_);
+  rightLayout->addWidget(vehicle_);
+  rightLayout->addWidget(context_);
+
+  auto* buttons = new QHBoxLayout;
+  editLabour_ = new QPushButton("&Edit labour...", right);
+  viewLabour_ = new QPushButton("&View labour...", right);
+  editParts_ = new QPushButton("Edit parts...", right);
+  viewParts_ = new QPushButton("View parts...", right);
+  editLabour_->setToolTip("Open the labour editor on this quote; what you change is stored "
+                          "when you close it");
+  viewLabour_->setToolTip("Open the labour editor to look at this quote's labour lines");
+  for (QPushButton* parts : {editParts_, viewParts_}) {
+    parts->setEnabled(false);
+    parts->setToolTip("The parts editor comes with a later release");
+  }
+  for (QPushButton* b : {editLabour_, viewLabour_, editParts_, viewParts_})
+    buttons->addWidget(b);
+  buttons->addStretch();
+  rightLayout->addLayout(buttons);
+
+  rightLayout->addWidget(Heading("Labour lines", right));
+  lines_ = MakeTable({"Item No", "Description", "Operation", "Hours", "Rate", "Amount"}, right);
+  lines_->horizontalHeader()->setSectionResizeMode(1, QHeaderView::Stretch);
+  lines_->setSelectionMode(QAbstractItemView::NoSelection);
+  rightLayout->addWidget(lines_, 1);
+  rightLayout->addWidget(Heading("Totals", right));
+  totals_ = MakeTable({"Category", "Hours", "Amount"}, right);
+  totals_->setSelectionMode(QAbstractItemView::NoSelection);
+  totals_->horizontalHeader()->setSectionResizeMode(0, QHeaderView::Stretch);
+  totals_->setRowCount(4);
+  totals_->setFixedHeight(totals_->horizontalHeader()->height() +
+                          4 * totals_->verticalHeader()->defaultSectionSize() + 4);
+  rightLayout->addWidget(totals_);
+
+  splitter->addWidget(left);
+  splitter->addWidget(right);
+  splitter->setStretchFactor(0, 2);
+  splitter->setStretchFactor(1, 3);
+  splitter->setSizes({500, 640});
+  setCentralWidget(splitter);
+  resize(1140, 620);
+
+  connect(quotes_, &QTableWidget::itemSelectionChanged, this, [this] { ShowQuote(); });
+  connect(quotes_, &QTableWidget::cellDoubleClicked, this, [this] { OpenLabour(eEdit); });
+  connect(editLabour_, &QPushButton::clicked, this, [this] { OpenLabour(eEdit); });
+  connect(viewLabour_, &QPushButton::clicked, this, [this] { OpenLabour(eView); });
+
+  Reload();
+  statusBar()->showMessage("Select a quote, then Edit labour to open the labour editor.");
+}
+
+void QuoteWindow::Reload() {
+  const std::string selected = CurrentQuote();
+  state_->headers = store_.ListQuotes();
+  const QSignalBlocker quiet(quotes_);
+  quotes_->setRowCount(static_cast<int>(state_->headers.size()));
+  for (int r = 0; r < static_cast<int>(state_->headers.size()); ++r) {
+    const auto& h = state_->headers[static_cast<size_t>(r)];
+    quotes_->setItem(r, 0, Cell(Q(h.qtnno)));
+    quotes_->setItem(r, 1, Cell(Q(h.customer)));
+    quotes_->setItem(r, 2, Cell(Q(h.vehicle)));
+  }
+  quotes_->resizeColumnsToContents();
+  if (selected.empty() || !SelectQuote(selected)) {
+    if (!state_->headers.empty()) quotes_->selectRow(0);
+  }
+  ShowQuote();
+}
+
+bool QuoteWindow::SelectQuote(const std::string& qtnno) {
+  for (int r = 0; r < static_cast<int>(state_->headers.size()); ++r)
+    if (state_->headers[static_cast<size_t>(r)].qtnno == qtnno) {
+      quotes_->selectRow(r);
+      return true;
+    }
+  return false;
+}
+
+std::string QuoteWindow::CurrentQuote() const {
+  const int row = quotes_->currentRow();
+  if (row < 0 || row >= static_cast<int>(state_->headers.size())) return {};
+  return state_->headers[static_cast<size_t>(row)].qtnno;
+}
+
+void QuoteWindow::ShowQuote() {
+  const auto header = store_.GetQuote(CurrentQuote());
+  editLabour_->setEnabled(header.has_value());
+  viewLabour_->setEnabled(header.has_value());
+  lines_->setRowCount(0);
+  if (!header) {
+    title_->setText("No quote selected");
+    vehicle_->clear();
+    context_->clear();
+    return;
+  }
+  title_->setText(Q(header->qtnno + "  " + header->customer));
+  vehicle_->setText(Q(header->vehicle));
+  context_->setText(Q("Schedule " + header->schedType + "    Rates per hour: R&R " +
+                      Hours(header->rrRate) + ", Repair " + Hours(header->raRate) + ", Paint " +
+                      Hours(header->ptRate)));
+
+  const QuoteSummary summary = StoredSummary(store_, header->qtnno);
+  lines_->setRowCount(static_cast<int>(summary.lines.size()));
+  for (int r = 0; r < static_cast<int>(summary.lines.size()); ++r) {
+    const SummaryLine& line = summary.lines[static_cast<size_t>(r)];
+    lines_->setItem(r, 0, Cell(Q(line.itemNo)));
+    lines_->setItem(r, 1, Cell(Q(line.description)));
+    lines_->setItem(r, 2, Cell(kCategoryNames[line.category]));
+    lines_->setItem(r, 3, Cell(Q(Hours(line.hours)), true));
+    lines_->setItem(r, 4, Cell(Q(Hours(line.rate)), true));
+    lines_->setItem(r, 5, Cell(line.reportOnly ? "report only" : Q(Hours(line.amount)), true));
+  }
+  lines_->resizeColumnToContents(0);
+  for (int c = 0; c < 3; ++c) {
+    totals_->setItem(c, 0, Cell(kCategoryNames[static_cast<size_t>(c)]));
+    totals_->setItem(c, 1, Cell(Q(Hours(summary.hours[static_cast<size_t>(c)])), true));
+    totals_->setItem(c, 2, Cell(Q(Hours(summary.amounts[static_cast<size_t>(c)])), true));
+  }
+  totals_->setItem(3, 0, Cell("Total"));
+  totals_->setItem(3, 1, Cell(Q(Hours(summary.TotalHours())), true));
+  totals_->setItem(3, 2, Cell(Q(Hours(summary.TotalAmount())), true));
+  for (int c = 0; c < 3; ++c) {
+    QFont bold = totals_->item(3, c)->font();
+    bold.setBold(true);
+    totals_->item(3, c)->setFont(bold);
+  }
+}
+
+void QuoteWindow::Report(const std::string& message) { statusBar()->showMessage(Q(message)); }
+
+std::string QuoteWindow::OpenLabour(EQuoteEditMode mode) {
+  auto header = store_.GetQuote(CurrentQuote());
+  if (!header) return {};
+  const std::string qtnno = header->qtnno;
+  std::string message;
+  try {
+    data::RecordsetPtr items = store_.LoadItems(qtnno, data::ItemKind::Labour);
+    std::string schedType = header->schedType;
+    state_->forms.ShowLabourForm(items, schedType, qtnno, header->subquote, header->make,
+                                 header->modelId, header->bodyId, header->schedId, header->mtaId,
+                                 header->thirdId, header->rrRate, header->raRate, header->ptRate,
+                                 header->defaultSched, header->insurerChanged, mode);
+    if (mode == eEdit) {
+      const data::SaveSummary saved = store_.SaveItems(qtnno, *items);
+      message = qtnno + ": stored " + std::to_string(saved.inserted) + " new, " +
+                std::to_string(saved.updated) + " changed and " + std::to_string(saved.deleted) +
+                " deleted records.";
+      if (schedType != header->schedType) {
+        header->schedType = schedType;
+        store_.SaveQuote(*header);
+        message += " Schedule now " + schedType + ".";
+      }
+    } else {
+      message = qtnno + ": viewed, nothing to store.";
+    }
+  } catch (const Error& e) {
+    message = qtnno + ": nothing stored. " + e.Description();
+    QMessageBox::critical(this, "Quote not stored",
+                          Q("The changes to quote " + qtnno + " were not stored.\n\n" +
+                            e.Description() + "\n(error " + std::to_string(e.Number()) + ", " +
+                            e.Source() + ")"));
+  } catch (const std::exception& e) {
+    message = qtnno + ": nothing stored. " + e.what();
+    QMessageBox::critical(this, "Quote not stored",
+                          Q("The changes to quote " + qtnno + " were not stored.\n\n" + e.what()));
+  }
+  Reload();
+  Report(message);
+  return message;
+}
+
+} // namespace belvane::quote

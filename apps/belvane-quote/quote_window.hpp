@@ -1,0 +1,69 @@
+#pragma once
+// The demo host's main window: the quotes of the database with their
+// vehicles, the selected quote's context, buttons that open the labour
+// editor in edit or view mode, and the quote's labour lines and totals,
+// read again from the database after each edit.
+//
+// An edit runs as a host does it: the quote's items are loaded into a
+// record set, CForms opens the editor over it (blocking until the
+// estimator closes it), and what changed is stored in one transaction. A
+// failure stores nothing and says why.
+
+#include "host/component_state.hpp"
+
+#include <QMainWindow>
+
+#include <memory>
+#include <string>
+
+class QLabel;
+class QPushButton;
+class QTableWidget;
+
+namespace belvane::data {
+class QuoteStore;
+}
+
+namespace belvane::quote {
+
+class QuoteWindow : public QMainWindow {
+  Q_OBJECT
+public:
+  explicit QuoteWindow(data::QuoteStore& store, QWidget* parent = nullptr);
+  ~QuoteWindow() override;
+
+  // Reads the quote list again, keeping the selection where it can.
+  void Reload();
+  bool SelectQuote(const std::string& qtnno);
+  std::string CurrentQuote() const;
+  // The labour editor over the selected quote; returns what was done (also
+  // shown in the status bar).
+  std::string OpenLabour(EQuoteEditMode mode);
+  data::QuoteStore& Store() const noexcept { return store_; }
+
+  QPushButton* EditLabourButton() const noexcept { return editLabour_; }
+  QPushButton* ViewLabourButton() const noexcept { return viewLabour_; }
+  QTableWidget* QuoteList() const noexcept { return quotes_; }
+  QTableWidget* Lines() const noexcept { return lines_; }
+  QTableWidget* Totals() const noexcept { return totals_; }
+
+private:
+  void ShowQuote();
+  void Report(const std::string& message);
+
+  struct State; // the quote list and CForms
+  data::QuoteStore& store_;
+  std::unique_ptr<State> state_;
+  QTableWidget* quotes_;
+  QLabel* title_;
+  QLabel* vehicle_;
+  QLabel* context_;
+  QPushButton* editLabour_;
+  QPushButton* viewLabour_;
+  QPushButton* editParts_;
+  QPushButton* viewParts_;
+  QTableWidget* lines_;
+  QTableWidget* totals_;
+};
+
+} // namespace belvane::quote
