@@ -1,0 +1,164 @@
+// The demo host: sample quotes, lines and totals, an edit stored in one
+// transaction and shown after it, a failed store that stores nothing.
+
+#include "../data/temp_dir.hpp"
+#include "data/catalogue.hpp"
+#include "data/quote_store.hpp"
+#include "labour/frm_labour.hpp"
+#include "qt/grid_view.hpp"
+#include "qt/qt_runtime.hpp"
+#include "quote_summary.hpp"
+#include "quote_window.hpp"
+#include "sample_quotes.hpp"
+
+#include <QApplication>
+#include <QMessageBox>
+#include <QPushButton>
+#include <QStatusBar>
+#include <QTableWidget>
+#include <QTest>
+#include <QTimer>
+
+#include <gtest/gtest.h>
+#include <sqlite3.h>
+
+#include <optional>
+
+using namespace belvane;
+namespace col = belvane::labour::col;
+
+namespace {
+
+class QuoteHostTest : public ::testing::Test {
+protected:
+  void SetUp() override {
+    data::SetCatalogueLocation(BELVANE_SAMPLE_CATALOGUE);
+    qt::QtRuntime::Application();
+    runtime_.emplace();
+    runtime_->ShowHandlerErrors(false);
+    use_.emplace(*runtime_);
+    ASSERT_EQ(quote::AddSampleQuotes(store), 4);
+  }
+  void TearDown() override {
+    use_.reset();
+    runtime_.reset();
+    data::SetCatalogueLocation("");
+  }
+
+  // Adds the first catalogue item that is not on the quote, with `hours`
+  // typed as its R&R hours, and closes the editor.
+  void AddAnItem(labour::frmLabour& form, const QString& hours) {
+    ASSERT_TRUE(QTest::qWaitForWindowActive(runtime_->Window(form)));
+    forms::FlexGrid& list = form.FGLabourItems(0);
+    int row = 0;
+    for (int r = 1; r < list.Rows() && row == 0; ++r) {
+      bool onQuote = false;
+      for (int s = 1; s < form.FGSelectedLabour.Rows(); ++s)
+        onQuote = onQuote || form.FGSelectedLabour.TextMatrix(s, 0) == list.TextMatrix(r, 0);
+      if (!onQuote && list.CellStyleAt(r, 2).backColor != grid::kGrey) row = r;
+    }
+    ASSERT_GT(row, 0);
+    added = list.TextMatrix(row, 0);
+    auto* view = dynamic_cast<qt::GridView*>(runtime_->View(list));
+    QWidget* cells = view->Table()->viewport();
+    const QPoint at = cells->mapFrom(view->Widget(), view->CellRect(row, 2).center());
+    QTest::mouseClick(cells, Qt::LeftButton, {}, at);
+    QTest::mouseDClick(cells, Qt::LeftButton, {}, at);
+    QTest::mouseRelease(cells, Qt::LeftButton, {}, at);
+    for (const QChar c : hours)
+      QTest::keyClick(QApplication::focusWidget(), c.toLatin1());
+    QTest::keyClick(QApplication::focusWidget(), Qt::Key_Return);
+    QTest::mouseClick(runtime_->Widget(form.cmdClose), Qt::LeftButton);
+  }
+
+  test::TempDir dir{"quote-host"};
+  data::QuoteStore store{dir.File("quotes.db")};
+  std::optional<qt::QtRuntime> runtime_;
+  std::optional<forms::ScopedRuntime> use_;
+  std::string added;
+};
+
+} // namespace
+
+TEST_F(QuoteHostTest, SampleQuotesComeOnceWithTheirLinesAndTotals) {
+  EXPECT_EQ(quote::AddSampleQuotes(store), 0); // not twice
+  const auto quotes = store.ListQuotes();
+  ASSERT_EQ(quotes.size(), 4u);
+  EXPECT_FALSE(quotes[0].vehicle.empty());
+  EXPECT_FALSE(quotes[0].bodyId.empty());
+
+  data::RecordsetPtr items = store.LoadItems("Q1001", data::ItemKind::Labour);
+  quote::QuoteSummary summary = quote::Summarize(*items, quotes[0]);
+  ASSERT_FALSE(summary.lines.empty());
+  double amount = 0;
+  for (const auto& line : summary.lines)
+    amount += line.hours * line.rate;
+  EXPECT_DOUBLE_EQ(summary.TotalAmount(), amount);
+
+  // A report-only line is listed, not charged.
+  items->MoveFirst();
+  items->Collect("report_on", data::Value(int16_t(1)));
+  const quote::QuoteSummary reported = quote::Summarize(*items, quotes[0]);
+  EXPECT_TRUE(reported.lines[0].reportOnly);
+  EXPECT_DOUBLE_EQ(reported.TotalAmount(), amount - summary.lines[0].amount);
+  EXPECT_TRUE(quote::StoredSummary(store, "Q1003").lines.empty());
+}
+
+TEST_F(QuoteHostTest, AnEditIsStoredAndTheWindowShowsTheNewLinesAndTotals) {
+  quote::QuoteWindow window(store);
+  window.show();
+  ASSERT_TRUE(window.SelectQuote("Q1001"));
+  const quote::QuoteSummary before = quote::StoredSummary(store, "Q1001");
+
+  runtime_->QueueModal(
+      [this](forms::Form& f) { AddAnItem(static_cast<labour::frmLabour&>(f), "3"); });
+  QTest::mouseClick(window.EditLabourButton(), Qt::LeftButton);
+
+  const quote::QuoteSummary after = quote::StoredSummary(store, "Q1001");
+  ASSERT_EQ(after.lines.size(), before.lines.size() + 1); // its R&R record, stored
+  EXPECT_DOUBLE_EQ(after.hours[quote::kRemoveReplace], before.hours[quote::kRemoveReplace] + 3);
+  EXPECT_EQ(window.statusBar()->currentMessage(),
+            "Q1001: stored 1 new, 0 changed and 0 deleted records.");
+  QTableWidget* lines = window.Lines();
+  ASSERT_EQ(lines->rowCount(), static_cast<int>(after.lines.size()));
+  bool shown = false;
+  for (int r = 0; r < lines->rowCount(); ++r)
+    shown = shown || (lines->item(r, 0)->text().toStdString() == added &&
+                      lines->item(r, 3)->text() == "3.00");
+  EXPECT_TRUE(shown);
+  EXPECT_EQ(window.Totals()->item(3, 1)->text().toStdString(), quote::Hours(after.TotalHours()));
+}
+
+TEST_F(QuoteHostTest, AFailedStoreStoresNothingAndSaysWhy) {
+  // The database refuses new items, as a full disk or a locked file would.
+  sqlite3* db = nullptr;
+  ASSERT_EQ(sqlite3_open(dir.File("quotes.db").c_str(), &db), SQLITE_OK);
+  ASSERT_EQ(sqlite3_exec(db,
+                         "CREATE TRIGGER refuse BEFORE INSERT ON quote_items "
+                         "BEGIN SELECT RAISE(ABORT, 'disk quota exceeded'); END",
+                         nullptr, nullptr, nullptr),
+            SQLITE_OK);
+  sqlite3_close(db);
+
+  quote::QuoteWindow window(store);
+  window.show();
+  ASSERT_TRUE(window.SelectQuote("Q1001"));
+  const quote::QuoteSummary before = quote::StoredSummary(store, "Q1001");
+  runtime_->QueueModal(
+      [this](forms::Form& f) { AddAnItem(static_cast<labour::frmLabour&>(f), "3"); });
+  QString said;
+  QTimer answer;
+  QObject::connect(&answer, &QTimer::timeout, [&said] {
+    if (auto* box = qobject_cast<QMessageBox*>(QApplication::activeModalWidget())) {
+      said = box->text();
+      box->button(QMessageBox::Ok)->click();
+    }
+  });
+  answer.start(10);
+  QTest::mouseClick(window.EditLabourButton(), Qt::LeftButton);
+
+  EXPECT_TRUE(said.contains("were not stored")) << said.toStdString();
+  EXPECT_TRUE(said.contains("disk quota exceeded")) << said.toStdString();
+  EXPECT_TRUE(window.statusBar()->currentMessage().startsWith("Q1001: nothing stored."));
+  EXPECT_EQ(quote::StoredSummary(store, "Q1001").lines.size(), before.lines.size());
+}
