@@ -22,6 +22,7 @@
 #include <filesystem>
 #include <iostream>
 #include <string>
+#include <unistd.h>
 
 #ifndef BELVANE_SAMPLE_CATALOGUE
 #define BELVANE_SAMPLE_CATALOGUE ""
@@ -63,8 +64,8 @@ int main(int argc, char** argv) {
                  "the catalogue)")
       ->type_name("FILE");
   cli.add_flag("--demo", demo,
-               "Play a short scripted session, print it and save pictures of the windows (on a "
-               "fresh quote database unless --quotes is given)");
+               "Play a short scripted session, print it and save pictures of the windows (on "
+               "fresh sample quotes unless --quotes is given)");
   cli.add_option("--screenshots", screenshots, "Folder for the scripted session's pictures")
       ->capture_default_str()
       ->type_name("DIR");
@@ -78,11 +79,22 @@ int main(int argc, char** argv) {
       return 1;
     }
     data::SetCatalogueLocation(catalogue);
+    // The scripted session starts from the sample quotes every time, on a
+    // quote database of its own that goes when it ends.
+    struct Scratch {
+      std::string path;
+      ~Scratch() {
+        std::error_code ignored;
+        if (!path.empty()) fs::remove(path, ignored);
+      }
+    } scratch;
     if (quotesPath.empty()) {
       if (demo) {
-        fs::create_directories(screenshots);
-        quotesPath = (fs::path(screenshots) / "quotes.db").string();
-        fs::remove(quotesPath); // the session starts from the sample quotes every time
+        scratch.path =
+            (fs::temp_directory_path() / ("belvane-quote-demo-" + std::to_string(getpid()) + ".db"))
+                .string();
+        fs::remove(scratch.path);
+        quotesPath = scratch.path;
       } else {
         quotesPath = (fs::path(catalogue).parent_path() / "quotes.db").string();
       }

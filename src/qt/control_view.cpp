@@ -106,10 +106,12 @@ ControlView::~ControlView() {
   if (model_) model_->RemoveObserver(this);
 }
 
+// The control is going with its form; the window goes next and takes the
+// widget with it. Nothing is done to the widget here: it must not raise Qt
+// events while the model is half destroyed.
 void ControlView::ModelDestroyed() {
   control_ = nullptr;
   model_ = nullptr;
-  if (widget_) widget_->hide();
 }
 
 const Scale& ControlView::GetScale() const { return window_.GetScale(); }

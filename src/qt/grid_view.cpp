@@ -90,34 +90,36 @@ void PaintCell(QPainter& painter, const QRect& rect, const grid::CellStyle& styl
 // Paints the data cells.
 class GridDelegate : public QStyledItemDelegate {
 public:
-  GridDelegate(const forms::FlexGrid& grid, QObject* parent)
-      : QStyledItemDelegate(parent), grid_(grid) {}
+  GridDelegate(const GridItemModel& items, QObject* parent)
+      : QStyledItemDelegate(parent), items_(items) {}
 
   void paint(QPainter* painter, const QStyleOptionViewItem& option,
              const QModelIndex& index) const override {
+    const forms::FlexGrid* grid = items_.Grid();
     const int row = index.row() + 1;
     const int col = index.column();
-    if (row >= grid_.Rows() || col >= grid_.Cols()) return;
-    const bool focus = grid_.HasFocus() && row == grid_.Row() && col == grid_.Col();
-    PaintCell(*painter, option.rect, grid_.CellStyleAt(row, col), grid_.TextView(row, col), focus,
+    if (!grid || row >= grid->Rows() || col >= grid->Cols()) return;
+    const bool focus = grid->HasFocus() && row == grid->Row() && col == grid->Col();
+    PaintCell(*painter, option.rect, grid->CellStyleAt(row, col), grid->TextView(row, col), focus,
               option.widget);
   }
 
 private:
-  const forms::FlexGrid& grid_;
+  const GridItemModel& items_;
 };
 
 // Paints the grid's row 0.
 class GridHeader : public QHeaderView {
 public:
-  GridHeader(const forms::FlexGrid& grid, QWidget* parent)
-      : QHeaderView(Qt::Horizontal, parent), grid_(grid) {}
+  GridHeader(const GridItemModel& items, QWidget* parent)
+      : QHeaderView(Qt::Horizontal, parent), items_(items) {}
 
 protected:
   void paintSection(QPainter* painter, const QRect& rect, int logicalIndex) const override {
-    if (logicalIndex >= grid_.Cols() || !rect.isValid()) return;
-    PaintCell(*painter, rect.adjusted(0, 0, -1, -1), grid_.CellStyleAt(0, logicalIndex),
-              grid_.TextView(0, logicalIndex), false, this);
+    const forms::FlexGrid* grid = items_.Grid();
+    if (!grid || logicalIndex >= grid->Cols() || !rect.isValid()) return;
+    PaintCell(*painter, rect.adjusted(0, 0, -1, -1), grid->CellStyleAt(0, logicalIndex),
+              grid->TextView(0, logicalIndex), false, this);
     painter->save();
     painter->setPen(palette().color(QPalette::Dark));
     painter->drawLine(rect.topRight(), rect.bottomRight());
@@ -126,7 +128,7 @@ protected:
   }
 
 private:
-  const forms::FlexGrid& grid_;
+  const GridItemModel& items_;
 };
 
 // The start of a row or column section in its header, or the header's end.
@@ -148,7 +150,7 @@ FlagGlyph FlagGlyphOf(const grid::CellStyle& style, std::string_view text) {
 // ---- GridItemModel ----
 
 GridItemModel::GridItemModel(const forms::FlexGrid& grid, QObject* parent)
-    : QAbstractTableModel(parent), grid_(grid), rows_(grid.Rows() - 1), cols_(grid.Cols()) {}
+    : QAbstractTableModel(parent), grid_(&grid), rows_(grid.Rows() - 1), cols_(grid.Cols()) {}
 
 int GridItemModel::rowCount(const QModelIndex& parent) const {
   return parent.isValid() ? 0 : rows_;
@@ -173,17 +175,17 @@ QVariant GridItemModel::headerData(int section, Qt::Orientation orientation, int
 }
 
 QVariant GridItemModel::CellData(int row, int col, int role) const {
-  if (row < 0 || col < 0 || row >= grid_.Rows() || col >= grid_.Cols()) return {};
+  if (!grid_ || row < 0 || col < 0 || row >= grid_->Rows() || col >= grid_->Cols()) return {};
   switch (role) {
   case Qt::DisplayRole:
-    return ToQString(grid_.TextView(row, col));
+    return ToQString(grid_->TextView(row, col));
   case Qt::ToolTipRole:
-    if (grid_.ToolTipText().empty()) return {};
-    return ToQString(grid_.ToolTipText());
+    if (grid_->ToolTipText().empty()) return {};
+    return ToQString(grid_->ToolTipText());
   default:
     break;
   }
-  const grid::CellStyle style = grid_.CellStyleAt(row, col);
+  const grid::CellStyle style = grid_->CellStyleAt(row, col);
   switch (role) {
   case Qt::BackgroundRole:
     return QBrush(ToQColor(style.backColor));
@@ -192,9 +194,9 @@ QVariant GridItemModel::CellData(int row, int col, int role) const {
   case Qt::FontRole:
     return ToQFont(style.fontName, style.fontSize, style.fontBold, style.fontItalic);
   case Qt::TextAlignmentRole:
-    return static_cast<int>(AlignmentOf(style.alignment, grid_.TextView(row, col)));
+    return static_cast<int>(AlignmentOf(style.alignment, grid_->TextView(row, col)));
   case Qt::CheckStateRole:
-    switch (FlagGlyphOf(style, grid_.TextView(row, col))) {
+    switch (FlagGlyphOf(style, grid_->TextView(row, col))) {
     case FlagGlyph::Ticked:
       return Qt::Checked;
     case FlagGlyph::Empty:
@@ -210,7 +212,8 @@ QVariant GridItemModel::CellData(int row, int col, int role) const {
 
 void GridItemModel::Insert(int firstRow, int count) {
   const int first = firstRow - 1;
-  if (count <= 0 || first < 0 || first > rows_ || rows_ + count != grid_.Rows() - 1) {
+  if (!grid_) return;
+  if (count <= 0 || first < 0 || first > rows_ || rows_ + count != grid_->Rows() - 1) {
     Reshape();
     return;
   }
@@ -221,7 +224,8 @@ void GridItemModel::Insert(int firstRow, int count) {
 
 void GridItemModel::Remove(int firstRow, int count) {
   const int first = firstRow - 1;
-  if (count <= 0 || first < 0 || first + count > rows_ || rows_ - count != grid_.Rows() - 1) {
+  if (!grid_) return;
+  if (count <= 0 || first < 0 || first + count > rows_ || rows_ - count != grid_->Rows() - 1) {
     Reshape();
     return;
   }
@@ -241,10 +245,11 @@ void GridItemModel::Changed(int firstRow, int firstCol, int lastRow, int lastCol
 }
 
 void GridItemModel::Reshape() {
-  if (rows_ == grid_.Rows() - 1 && cols_ == grid_.Cols()) return;
+  if (!grid_) return;
+  if (rows_ == grid_->Rows() - 1 && cols_ == grid_->Cols()) return;
   beginResetModel();
-  rows_ = grid_.Rows() - 1;
-  cols_ = grid_.Cols();
+  rows_ = grid_->Rows() - 1;
+  cols_ = grid_->Cols();
   endResetModel();
 }
 
@@ -262,7 +267,7 @@ GridView::GridView(FormWindow& window, forms::FlexGrid& grid, QWidget* parent)
   QWidget* frame = Widget();
   table_ = new GridTable(frame);
   items_ = new GridItemModel(grid, this);
-  auto* header = new GridHeader(grid, table_);
+  auto* header = new GridHeader(*items_, table_);
   header->setSectionResizeMode(QHeaderView::Fixed);
   header->setMinimumSectionSize(0);
   header->setStretchLastSection(false);
@@ -275,7 +280,7 @@ GridView::GridView(FormWindow& window, forms::FlexGrid& grid, QWidget* parent)
   rows->setDefaultSectionSize(GetScale().RowPixels());
   rows->hide();
   table_->setModel(items_);
-  table_->setItemDelegate(new GridDelegate(grid, table_));
+  table_->setItemDelegate(new GridDelegate(*items_, table_));
   table_->setSelectionMode(QAbstractItemView::NoSelection);
   table_->setEditTriggers(QAbstractItemView::NoEditTriggers);
   table_->setTabKeyNavigation(false);
@@ -579,6 +584,14 @@ void GridView::CurrentCellChanged(int, int) {
 void GridView::FocusChanged(bool hasFocus) {
   ControlView::FocusChanged(hasFocus);
   if (Alive()) table_->viewport()->update();
+}
+
+// The grid is going (its form is being destroyed): nothing reads it from
+// now on, whatever Qt still asks of the table.
+void GridView::ModelDestroyed() {
+  if (items_) items_->Detach();
+  if (table_) table_->onGeometries = nullptr;
+  ControlView::ModelDestroyed();
 }
 
 void GridView::RepaintRequested() {

@@ -52,6 +52,10 @@ public:
   QVariant headerData(int section, Qt::Orientation orientation, int role) const override;
   Qt::ItemFlags flags(const QModelIndex& index) const override;
 
+  // The grid shown, nullptr once it is gone: nothing reads it any more.
+  const forms::FlexGrid* Grid() const noexcept { return grid_; }
+  void Detach() noexcept { grid_ = nullptr; }
+
   void Insert(int firstRow, int count);
   void Remove(int firstRow, int count);
   void Changed(int firstRow, int firstCol, int lastRow, int lastCol);
@@ -61,7 +65,7 @@ public:
 private:
   QVariant CellData(int row, int col, int role) const;
 
-  const forms::FlexGrid& grid_;
+  const forms::FlexGrid* grid_;
   int rows_;
   int cols_;
 };
@@ -103,6 +107,7 @@ public:
   void CurrentCellChanged(int row, int col) override;
   void FocusChanged(bool hasFocus) override;
   void RepaintRequested() override;
+  void ModelDestroyed() override;
 
 protected:
   void Sync(grid::Property property) override;
