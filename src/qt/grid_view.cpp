@@ -413,7 +413,10 @@ void GridView::SyncScroll() {
   if (!Alive() || !table_) return;
   QHeaderView* rows = table_->verticalHeader();
   QHeaderView* cols = table_->horizontalHeader();
-  const int rowOffset = SectionStart(*rows, grid_.TopRow() - 1);
+  // Rows of the standard height (the usual case, and the one of big
+  // catalogues) need no walk over the header's sections.
+  const int rowOffset = uniformRows_ ? (grid_.TopRow() - 1) * GetScale().RowPixels()
+                                     : SectionStart(*rows, grid_.TopRow() - 1);
   const int colOffset = SectionStart(*cols, grid_.LeftCol());
   if (rows->offset() != rowOffset || cols->offset() != colOffset) {
     rows->setOffset(rowOffset);
@@ -549,18 +552,20 @@ void GridView::CellsChanged(int firstRow, int firstCol, int lastRow, int lastCol
   if (Alive()) items_->Changed(firstRow, firstCol, lastRow, lastCol);
 }
 
+// Rows added below the top row leave the table's offset where it is (a
+// catalogue filling row by row); rows above it move the top row's pixels.
 void GridView::RowsInserted(int firstRow, int count) {
   if (!Alive()) return;
   items_->Insert(firstRow, count);
   LayOut();
-  SyncScroll();
+  if (firstRow <= grid_.TopRow()) SyncScroll();
 }
 
 void GridView::RowsRemoved(int firstRow, int count) {
   if (!Alive()) return;
   items_->Remove(firstRow, count);
   LayOut();
-  SyncScroll();
+  if (firstRow <= grid_.TopRow()) SyncScroll();
 }
 
 void GridView::LayoutChanged() {

@@ -142,6 +142,7 @@ private:
   QScrollBar* hbar_ = nullptr;
   QWidget* corner_ = nullptr;
   Layout layout_;
+  bool uniformRows_ = true; // every data row of the standard height
   bool syncingScroll_ = false;
   int wheelRemainder_ = 0;
 };

@@ -210,3 +210,31 @@ TEST(QtApplication, IsCreatedOnFirstUseWhenTheHostHasNone) {
   ASSERT_NE(qobject_cast<QApplication*>(QCoreApplication::instance()), nullptr);
   EXPECT_TRUE(QCoreApplication::testAttribute(Qt::AA_ShareOpenGLContexts));
 }
+
+// Run on its own: with nowhere to show windows, the first use is refused
+// with an error instead of the process aborting.
+TEST(QtApplication, IsRefusedWithAClearErrorWhereThereIsNoDisplay) {
+  if (QCoreApplication::instance()) GTEST_SKIP() << "an application exists already";
+  const QByteArray platform = qgetenv("QT_QPA_PLATFORM");
+  const QByteArray display = qgetenv("DISPLAY");
+  const QByteArray wayland = qgetenv("WAYLAND_DISPLAY");
+  qunsetenv("QT_QPA_PLATFORM");
+  qunsetenv("DISPLAY");
+  qunsetenv("WAYLAND_DISPLAY");
+  QtRuntime runtime;
+  belvane::forms::ScopedRuntime use(runtime);
+  long number = 0;
+  std::string description;
+  try {
+    belvane::forms::MsgBox("no display");
+  } catch (const belvane::Error& e) {
+    number = e.Number();
+    description = e.Description();
+  }
+  qputenv("QT_QPA_PLATFORM", platform);
+  if (!display.isEmpty()) qputenv("DISPLAY", display);
+  if (!wayland.isEmpty()) qputenv("WAYLAND_DISPLAY", wayland);
+  EXPECT_EQ(number, 5);
+  EXPECT_NE(description.find("No display"), std::string::npos) << description;
+  EXPECT_EQ(QCoreApplication::instance(), nullptr);
+}
