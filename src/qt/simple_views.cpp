@@ -16,6 +16,7 @@
 #include <QLabel>
 #include <QLineEdit>
 #include <QMouseEvent>
+#include <QPainter>
 #include <QPushButton>
 #include <QRadioButton>
 
@@ -178,10 +179,37 @@ private:
   QRadioButton* widget_;
 };
 
+// A frame draws its caption on its top border line, the controls it holds
+// placed from its top-left corner as the model has them (a group box would
+// put its border below the caption, through the controls near the top).
+class FrameBox : public QGroupBox {
+public:
+  using QGroupBox::QGroupBox;
+
+protected:
+  void paintEvent(QPaintEvent*) override {
+    QPainter painter(this);
+    const QFontMetrics metrics(font());
+    const int line = title().isEmpty() ? 0 : metrics.height() / 2;
+    const QRect border = rect().adjusted(0, line, -1, -1);
+    painter.setPen(palette().color(QPalette::Mid));
+    painter.drawRect(border);
+    painter.setPen(palette().color(QPalette::Light));
+    painter.drawRect(border.adjusted(1, 1, 1, 1).intersected(rect().adjusted(0, 0, -1, -1)));
+    if (title().isEmpty()) return;
+    const QString text = metrics.elidedText(title(), Qt::ElideRight, width() - 16);
+    const QRect caption(6, 0, metrics.horizontalAdvance(text) + 4, metrics.height());
+    painter.fillRect(caption, palette().color(QPalette::Window));
+    painter.setPen(
+        palette().color(isEnabled() ? QPalette::Active : QPalette::Disabled, QPalette::WindowText));
+    painter.drawText(caption, Qt::AlignCenter, text);
+  }
+};
+
 class FrameView : public ControlView {
 public:
   FrameView(FormWindow& window, forms::Frame& frame, QWidget* parent)
-      : ControlView(window, frame, new QGroupBox(parent)), frame_(frame),
+      : ControlView(window, frame, new FrameBox(parent)), frame_(frame),
         widget_(static_cast<QGroupBox*>(Widget())) {}
   void SyncAll() override {
     ControlView::SyncAll();
