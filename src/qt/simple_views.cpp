@@ -319,11 +319,11 @@ void TextBoxView::SyncSelection() {
 // A text box too low for the line edit's frame (an editor laid over a grid
 // cell) draws none, so its text has the cell's room.
 void TextBoxView::SyncFrame() {
-  QLineEdit probe;
-  probe.setFont(edit_->font());
-  const bool framed = edit_->height() >= probe.sizeHint().height();
+  edit_->setTextMargins(0, 0, 0, 0);
+  edit_->setFrame(true);
+  const bool framed = edit_->height() >= edit_->sizeHint().height();
   edit_->setFrame(framed);
-  edit_->setTextMargins(framed ? 0 : 1, 0, framed ? 0 : 1, 0);
+  if (!framed) edit_->setTextMargins(1, 0, 1, 0);
 }
 
 void TextBoxView::TakeUserSelection() {
