@@ -1,5 +1,7 @@
 #include "forms/utf8.hpp"
 
+#include "text/strings.hpp"
+
 namespace belvane::forms::utf8 {
 
 namespace {
@@ -41,26 +43,7 @@ std::size_t ByteOffset(std::string_view text, int index) {
   return pos;
 }
 
-std::string Encode(char32_t c) {
-  std::string out;
-  if (c > 0x10FFFF || (c >= 0xD800 && c <= 0xDFFF)) c = 0xFFFD;
-  if (c < 0x80) {
-    out.push_back(static_cast<char>(c));
-  } else if (c < 0x800) {
-    out.push_back(static_cast<char>(0xC0 | (c >> 6)));
-    out.push_back(static_cast<char>(0x80 | (c & 0x3F)));
-  } else if (c < 0x10000) {
-    out.push_back(static_cast<char>(0xE0 | (c >> 12)));
-    out.push_back(static_cast<char>(0x80 | ((c >> 6) & 0x3F)));
-    out.push_back(static_cast<char>(0x80 | (c & 0x3F)));
-  } else {
-    out.push_back(static_cast<char>(0xF0 | (c >> 18)));
-    out.push_back(static_cast<char>(0x80 | ((c >> 12) & 0x3F)));
-    out.push_back(static_cast<char>(0x80 | ((c >> 6) & 0x3F)));
-    out.push_back(static_cast<char>(0x80 | (c & 0x3F)));
-  }
-  return out;
-}
+std::string Encode(char32_t c) { return text::EncodeUtf8(c); }
 
 char32_t Next(std::string_view text, std::size_t& pos) {
   const std::size_t length = SequenceLength(text, pos);

@@ -18,6 +18,7 @@ constexpr std::array<char32_t, 32> kHigh = {
     0x2013, 0x2014, 0x02DC, 0x2122, 0x0161, 0x203A, 0x0153, 0x009D, 0x017E, 0x0178};
 
 void AppendUtf8(std::string& out, char32_t c) {
+  if (c > 0x10FFFF || (c >= 0xD800 && c <= 0xDFFF)) c = 0xFFFD;
   if (c < 0x80) {
     out.push_back(static_cast<char>(c));
   } else if (c < 0x800) {
@@ -108,6 +109,12 @@ template <typename F> std::string MapChars(std::string_view s, F f) {
 }
 
 } // namespace
+
+std::string EncodeUtf8(char32_t character) {
+  std::string out;
+  AppendUtf8(out, character);
+  return out;
+}
 
 std::string LTrim(std::string_view s) {
   size_t b = s.find_first_not_of(' ');

@@ -23,6 +23,10 @@ std::string LCase(std::string_view utf8);
 // Case-insensitive equality under the rules of UCase.
 bool EqualsNoCase(std::string_view a, std::string_view b);
 
+// The UTF-8 form of one character; surrogates and values past U+10FFFF
+// give U+FFFD.
+std::string EncodeUtf8(char32_t character);
+
 // Windows-1252 bytes to UTF-8. Every byte maps to a character: the five
 // codes Windows-1252 leaves undefined (0x81, 0x8D, 0x8F, 0x90, 0x9D) map to
 // the C1 controls U+0081 etc., so any byte string round-trips.
