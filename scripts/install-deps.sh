@@ -6,10 +6,10 @@ set -euo pipefail
 
 PACKAGES=(
   build-essential cmake ninja-build ccache pkg-config
-  clang-format clang-14 libclang-rt-14-dev
+  clang-format
   libgtest-dev libgmock-dev libbenchmark-dev
-  libfmt-dev libcli11-dev nlohmann-json3-dev
-  libsqlite3-dev sqlite3 libpq-dev libssl-dev
+  libfmt-dev libcli11-dev
+  libsqlite3-dev sqlite3 libssl-dev
   qt6-base-dev qt6-webengine-dev libgl-dev
   xvfb xauth
 )
