@@ -30,7 +30,8 @@ int main(int argc, char** argv) {
       RegisterField,
       RegisterCatalogue,
   };
-  for (RegisterFn fn : groups) fn(app, exitCode);
+  for (RegisterFn fn : groups)
+    fn(app, exitCode);
   try {
     app.parse(argc, argv);
   } catch (const CLI::ParseError& e) {

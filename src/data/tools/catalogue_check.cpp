@@ -92,14 +92,14 @@ CheckReport CheckCatalogue(const std::string& database) {
                        [&](const std::string& n) { return text::EqualsNoCase(n, name); });
   };
 
-  for (const TableSpec& spec : CatalogueTables()) {
-    if (!db.HasTable(spec.name)) {
-      report.missing.push_back("table " + spec.name);
+  for (const TableSpec& def : CatalogueTables()) {
+    if (!db.HasTable(def.name)) {
+      report.missing.push_back("table " + def.name);
       continue;
     }
-    const auto names = columnsOf(spec.name);
-    for (const ColumnSpec& c : spec.columns)
-      if (!hasColumn(names, c.name)) report.missing.push_back("column " + spec.name + "." + c.name);
+    const auto names = columnsOf(def.name);
+    for (const ColumnSpec& c : def.columns)
+      if (!hasColumn(names, c.name)) report.missing.push_back("column " + def.name + "." + c.name);
   }
 
   // The enciphered columns: as the catalogue lists them, else the standard

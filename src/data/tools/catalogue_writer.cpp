@@ -38,12 +38,12 @@ void SqliteCatalogueWriter::Insert(std::string_view table, const std::vector<Val
     if (text::EqualsNoCase(omitted, table)) return;
   auto it = inserts_.find(table);
   if (it == inserts_.end()) {
-    const TableSpec* spec = FindCatalogueTable(table);
-    if (!spec) db_->Fail(err::kNoSuchTable, "no such catalogue table: " + std::string(table));
-    std::string sql = "INSERT INTO " + QuoteName(spec->name) + " (";
+    const TableSpec* def = FindCatalogueTable(table);
+    if (!def) db_->Fail(err::kNoSuchTable, "no such catalogue table: " + std::string(table));
+    std::string sql = "INSERT INTO " + QuoteName(def->name) + " (";
     std::string values;
-    for (size_t i = 0; i < spec->columns.size(); ++i) {
-      sql += (i ? ", " : "") + QuoteName(spec->columns[i].name);
+    for (size_t i = 0; i < def->columns.size(); ++i) {
+      sql += (i ? ", " : "") + QuoteName(def->columns[i].name);
       values += (i ? ", ?" : "?") + std::to_string(i + 1);
     }
     sql += ") VALUES (" + values + ")";

@@ -184,8 +184,8 @@ const std::vector<PartTemplate>& PartTemplates() {
 }
 
 // Parts past the first pass over the templates are variants of them.
-constexpr std::array<const char*, 6> kVariants{" (SPORT)",  " (HIGH SPEC)", " (BASE)",
-                                               " (CHROME)", " (LED)",       " (HEAVY DUTY)"};
+constexpr std::array<const char*, 6> kVariants{" (SPORT)",  " (PREMIUM)", " (BASE)",
+                                               " (CHROME)", " (LED)",     " (HEAVY DUTY)"};
 
 // The number plate bracket differs between states: state 1 sells one, state
 // 2 another, and neither appears in the other state.
