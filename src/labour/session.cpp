@@ -238,7 +238,19 @@ void frmLabour::SetQuoteNo(data::RecordsetPtr& prsLab, std::string& psSchedType,
   mbInsurerChanged = pbInsurerChanged;
   meMode = peMode;
 
-  Show(forms::ShowStyle::Modal);
+  try {
+    Show(forms::ShowStyle::Modal);
+  } catch (...) {
+    // A session that could not run (a desktop refusing the window, say)
+    // leaves no editor loaded behind it for SaveLabourChanges to reach.
+    if (Loaded()) {
+      try {
+        Unload();
+      } catch (...) {
+      }
+    }
+    throw;
+  }
 
   status.Unload();
   psSchedType = msSchedType;

@@ -191,6 +191,25 @@ TEST_F(SessionTest, NoRecordSetIsRefusedBeforeAnythingOpens) {
   runtime.Reset(); // the queued script was never played
 }
 
+TEST_F(SessionTest, ASessionThatFailsLeavesNothingLoaded) {
+  AddRecord(1, "100", "BONNET R&I", "R&R", 1.5);
+  Stored();
+  frmLabour* form = nullptr;
+  EXPECT_THROW(Open(eEdit,
+                    [&](frmLabour& f) {
+                      form = &f;
+                      throw belvane::Error(5, "the desktop went away", "test");
+                    }),
+               belvane::Error);
+  ASSERT_NE(form, nullptr);
+  EXPECT_FALSE(form->Loaded());
+  EXPECT_FALSE(host::gbLabourFormLoaded);
+  EXPECT_FALSE(host::StatusBox().Loaded());
+  EXPECT_EQ(forms::Screen.MousePointer(), 0);
+  EXPECT_EQ(forms.SaveLabourChanges(), 0);
+  EXPECT_EQ(quote->StoredStatus(0), data::RecordStatus::Unchanged);
+}
+
 TEST_F(SessionTest, SessionsReuseOneFormAndStartAfresh) {
   frmLabour* first = nullptr;
   Open(eEdit, [&](frmLabour& f) {
