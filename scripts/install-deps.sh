@@ -10,6 +10,7 @@ PACKAGES=(
   libgtest-dev libgmock-dev libbenchmark-dev
   libfmt-dev libcli11-dev
   libsqlite3-dev sqlite3 libssl-dev
+  libpq-dev postgresql
   qt6-base-dev qt6-webengine-dev libgl-dev
   xvfb xauth
 )

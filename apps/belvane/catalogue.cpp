@@ -5,6 +5,7 @@
 #include "data/sqlite/sqlite_catalogue.hpp"
 #include "data/tools/catalogue_check.hpp"
 #include "data/tools/csv_import.hpp"
+#include "data/tools/pg_catalogue_writer.hpp"
 #include "data/tools/sample_catalogue.hpp"
 #include "text/error.hpp"
 
@@ -38,9 +39,19 @@ std::string KeyFooter() {
                      cipher::kFieldKeyFilePath);
 }
 
-int RunSample(const std::string& out, const data::tools::SampleOptions& options,
-              const std::string& keyFile) {
+int RunSample(const std::string& out, const std::string& pg,
+              const data::tools::SampleOptions& options, const std::string& keyFile) {
   SetUpKey(keyFile);
+  if (!pg.empty()) {
+    data::tools::PostgresCatalogueWriter writer(pg);
+    const auto summary = data::tools::WriteSampleCatalogue(writer, options);
+    writer.Commit();
+    fmt::print("Wrote the catalogue into PostgreSQL: seed {}, {} models\n", options.seed,
+               options.models);
+    for (const auto& [table, rows] : summary)
+      fmt::print("  {:<14} {:>9} rows\n", table, rows);
+    return 0;
+  }
   const auto summary = data::tools::WriteSampleCatalogueFile(out, options);
   std::error_code ec;
   const auto bytes = std::filesystem::file_size(out, ec);
@@ -110,15 +121,20 @@ void RegisterCatalogue(CLI::App& app, int& exitCode) {
 
   {
     struct Opt {
-      std::string out, keyFile;
+      std::string out, pg, keyFile;
       data::tools::SampleOptions sample;
     };
     auto o = std::make_shared<Opt>();
-    auto* cmd = group->add_subcommand("sample",
-                                      "Write a realistic, deterministic sample catalogue (SQLite)");
-    cmd->add_option("--out", o->out, "Catalogue file to write (replaced when complete)")
-        ->required()
-        ->type_name("FILE");
+    auto* cmd = group->add_subcommand(
+        "sample", "Write a realistic, deterministic sample catalogue (SQLite or PostgreSQL)");
+    auto* out = cmd->add_option("--out", o->out, "Catalogue file to write (replaced when complete)")
+                    ->type_name("FILE");
+    auto* pg = cmd->add_option("--pg", o->pg,
+                               "PostgreSQL database to write the catalogue into (libpq connection "
+                               "string or URI; its catalogue tables are replaced when complete)")
+                   ->type_name("CONNINFO");
+    out->excludes(pg);
+    pg->excludes(out);
     cmd->add_option("--seed", o->sample.seed, "Seed of the generator")->capture_default_str();
     cmd->add_option("--models", o->sample.models, "Vehicle models, over four makes")
         ->capture_default_str()
@@ -132,7 +148,10 @@ void RegisterCatalogue(CLI::App& app, int& exitCode) {
         ->check(CLI::Range(0, data::tools::SampleLabourOperationCount()));
     cmd->add_option("--key-file", o->keyFile, "File holding the field key text")->type_name("FILE");
     cmd->footer(KeyFooter());
-    cmd->callback([o, &exitCode] { exitCode = RunSample(o->out, o->sample, o->keyFile); });
+    cmd->callback([o, &exitCode] {
+      if (o->out.empty() && o->pg.empty()) throw CLI::RequiredError("--out or --pg");
+      exitCode = RunSample(o->out, o->pg, o->sample, o->keyFile);
+    });
   }
 
   {

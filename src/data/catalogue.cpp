@@ -1,11 +1,13 @@
 #include "data/catalogue.hpp"
 
+#include "data/postgres/postgres_catalogue.hpp"
 #include "data/sqlite/sqlite_catalogue.hpp"
 
 #include <atomic>
 #include <cstdlib>
 #include <mutex>
 #include <optional>
+#include <string_view>
 
 namespace belvane::data {
 
@@ -31,6 +33,19 @@ ThreadCatalogue& ThisThread() {
 const char* NonEmptyEnv(const char* name) {
   const char* v = std::getenv(name);
   return v && *v ? v : nullptr;
+}
+
+// The service over a location: a PostgreSQL URI ("postgresql://...",
+// "postgres://...") or a connection string after "postgresql:" or
+// "postgres:" names a PostgreSQL catalogue; anything else is an SQLite file.
+std::shared_ptr<CatalogueDataObject> OpenCatalogue(const std::string& location) {
+  for (const std::string_view prefix : {"postgresql:", "postgres:"}) {
+    if (!location.starts_with(prefix)) continue;
+    const std::string rest = location.substr(prefix.size());
+    // A URI goes to libpq whole; otherwise the rest is a connection string.
+    return std::make_shared<PostgresCatalogue>(rest.starts_with("//") ? location : rest);
+  }
+  return std::make_shared<SqliteCatalogue>(location);
 }
 
 } // namespace
@@ -74,7 +89,7 @@ std::shared_ptr<CatalogueDataObject> Catalogue() {
     t.object.reset();
     // Construction opens the database; when it throws, nothing is kept and
     // the next call tries again.
-    t.object = std::make_shared<SqliteCatalogue>(CatalogueLocation());
+    t.object = OpenCatalogue(CatalogueLocation());
     t.generation = generation;
   }
   return t.object;
