@@ -73,10 +73,12 @@ public:
 };
 
 // The calling thread's catalogue data service: the object handed over with
-// SetCatalogueDataObject, else one created on first use over the SQLite
-// catalogue at CatalogueLocation() and kept for later calls. When it cannot
-// be created (for example the file is missing) the error is raised and the
-// next call tries again.
+// SetCatalogueDataObject, else one created on first use over the catalogue
+// at CatalogueLocation() and kept for later calls: a PostgreSQL catalogue
+// for a location beginning "postgresql:" or "postgres:" (a URI, or a
+// connection string after the prefix), else an SQLite catalogue file. When
+// it cannot be created (for example the file is missing) the error is
+// raised and the next call tries again.
 std::shared_ptr<CatalogueDataObject> Catalogue();
 
 // Sets the catalogue database used by every thread from now on; the empty
