@@ -46,15 +46,15 @@ constexpr std::array<Column, 6> kCatalogueColumns{{
     {"Allow", 600, grid::kAlignCenterCenter},
 }};
 
-constexpr std::array<Column, 7> kSearchColumns{{
-    {"Item No", 800, grid::kAlignCenterCenter},
-    {"Description", -1, grid::kAlignLeftCenter},
-    {"R&R", 1300, grid::kAlignRightCenter},
-    {"Repair", 1300, grid::kAlignRightCenter},
-    {"Paint", 1300, grid::kAlignRightCenter},
-    {"Allow", 600, grid::kAlignCenterCenter},
-    {"Index", 600, grid::kAlignCenterCenter},
-}};
+// The search grid: the catalogue's columns and the row's index in it.
+constexpr std::array<Column, 7> SearchColumns() {
+  std::array<Column, 7> columns{};
+  for (size_t c = 0; c < kCatalogueColumns.size(); ++c)
+    columns[c] = kCatalogueColumns[c];
+  columns[6] = {"Index", 600, grid::kAlignCenterCenter};
+  return columns;
+}
+constexpr std::array<Column, 7> kSearchColumns = SearchColumns();
 
 constexpr std::array<Column, 16> kSelectedColumns{{
     {"Item No", 800, grid::kAlignCenterCenter},

@@ -3,6 +3,8 @@
 #include "cipher/unsigned_word.hpp"
 #include "text/error.hpp"
 
+#include "error_number.hpp"
+
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -24,14 +26,7 @@ std::vector<std::uint8_t> Hex(std::string_view hex) {
   return out;
 }
 
-long ErrorNumber(const std::function<void()>& f) {
-  try {
-    f();
-  } catch (const Error& e) {
-    return e.Number();
-  }
-  return 0;
-}
+using belvane::test::ErrorNumber;
 
 std::uint64_t Block(std::string_view hex) { return std::stoull(std::string(hex), nullptr, 16); }
 

@@ -2,6 +2,7 @@
 // labour and parts queries, the diagram question, and the failures they
 // must be able to tell apart.
 #include "catalogue_contract.hpp"
+#include "error_number.hpp"
 
 #include "cipher/field.hpp"
 #include "text/error.hpp"
@@ -99,15 +100,7 @@ std::vector<std::string> FieldNames(const Recordset& rs) {
   return out;
 }
 
-long ErrorNumber(auto&& fn, std::string* description = nullptr) {
-  try {
-    fn();
-  } catch (const Error& e) {
-    if (description) *description = e.Description();
-    return e.Number();
-  }
-  return 0;
-}
+using belvane::test::ErrorNumber;
 
 } // namespace
 

@@ -5,6 +5,7 @@
 // location and command-line ways to reach it. The cluster comes from the
 // ctest fixture (tests/data/pg_cluster.sh) through BELVANE_TEST_PG.
 #include "catalogue_contract.hpp"
+#include "error_number.hpp"
 #include "temp_dir.hpp"
 
 #include "data/postgres/pg_db.hpp"
@@ -87,15 +88,7 @@ test::CatalogueBackend PostgresBackend() {
           }};
 }
 
-long ErrorNumber(auto&& fn, std::string* description = nullptr) {
-  try {
-    fn();
-  } catch (const Error& e) {
-    if (description) *description = e.Description();
-    return e.Number();
-  }
-  return 0;
-}
+using belvane::test::ErrorNumber;
 
 std::vector<DataType> FieldTypes(const Recordset& rs) {
   std::vector<DataType> out;

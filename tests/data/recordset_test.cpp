@@ -1,4 +1,5 @@
 #include "data/recordset.hpp"
+#include "error_number.hpp"
 #include "text/error.hpp"
 
 #include <gtest/gtest.h>
@@ -8,14 +9,7 @@ using namespace belvane::data;
 
 namespace {
 
-long ErrorNumber(auto&& fn) {
-  try {
-    fn();
-  } catch (const Error& e) {
-    return e.Number();
-  }
-  return 0;
-}
+using belvane::test::ErrorNumber;
 
 // A quote item record set with a handful of labour records, loaded as a host
 // would load it from its store.

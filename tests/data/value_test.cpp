@@ -1,4 +1,5 @@
 #include "data/value.hpp"
+#include "error_number.hpp"
 #include "text/error.hpp"
 #include "text/number.hpp"
 
@@ -8,14 +9,7 @@ using namespace belvane;
 using namespace belvane::data;
 
 namespace {
-long ErrorNumber(auto&& fn) {
-  try {
-    fn();
-  } catch (const Error& e) {
-    return e.Number();
-  }
-  return 0;
-}
+using belvane::test::ErrorNumber;
 } // namespace
 
 TEST(Value, ConvertsAsAHostExpects) {

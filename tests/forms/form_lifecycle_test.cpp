@@ -1,3 +1,4 @@
+#include "error_number.hpp"
 #include "forms/controls.hpp"
 #include "forms/form.hpp"
 #include "forms/input.hpp"
@@ -57,14 +58,7 @@ protected:
   SimulatedUser user;
 };
 
-long ErrorNumber(const std::function<void()>& f) {
-  try {
-    f();
-  } catch (const belvane::Error& e) {
-    return e.Number();
-  }
-  return 0;
-}
+using belvane::test::ErrorNumber;
 
 } // namespace
 

@@ -1,3 +1,4 @@
+#include "error_number.hpp"
 #include "forms/input.hpp"
 #include "forms/keys.hpp"
 #include "forms/simulated_user.hpp"
@@ -25,14 +26,7 @@ protected:
   SimulatedUser user;
 };
 
-long ErrorNumber(const std::function<void()>& f) {
-  try {
-    f();
-  } catch (const belvane::Error& e) {
-    return e.Number();
-  }
-  return 0;
-}
+using belvane::test::ErrorNumber;
 
 } // namespace
 

@@ -1,3 +1,4 @@
+#include "error_number.hpp"
 #include "grid/flex_grid.hpp"
 #include "text/error.hpp"
 
@@ -11,14 +12,7 @@ using namespace belvane::grid;
 
 namespace {
 
-long ErrorNumber(const std::function<void()>& f) {
-  try {
-    f();
-  } catch (const Error& e) {
-    return e.Number();
-  }
-  return 0;
-}
+using belvane::test::ErrorNumber;
 
 // Records LeaveCell and EnterCell with the cell that is current when each fires.
 struct CellEvents {
