@@ -1,7 +1,7 @@
 #include "quote_window.hpp"
 
 #include "data/quote_store.hpp"
-#include "host/cforms.hpp"
+#include "entry/cforms.hpp"
 #include "quote_summary.hpp"
 #include "text/error.hpp"
 

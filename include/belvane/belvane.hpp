@@ -16,5 +16,5 @@
 #include "forms/keys.hpp"
 #include "forms/runtime.hpp"
 #include "forms/simulated_user.hpp"
-#include "host/cforms.hpp"
+#include "entry/cforms.hpp"
 #include "text/error.hpp"

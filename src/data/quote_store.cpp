@@ -3,10 +3,12 @@
 #include "data/sqlite/sqlite_db.hpp"
 
 #include "text/error.hpp"
+#include "text/strings.hpp"
 
 #include <sqlite3.h>
 
 #include <array>
+#include <string_view>
 
 namespace belvane::data {
 
@@ -46,6 +48,41 @@ constexpr std::array<ItemField, 21> kItemFields{{
 }};
 
 using sqlite::Statement;
+
+constexpr size_t kDelItemField = 1;
+constexpr size_t kAllowField = 13;
+
+// Names a quote item in a message: its item number, description and kind.
+std::string DescribeItem(const Recordset& items, size_t rec, const std::vector<size_t>& fieldOf) {
+  auto text = [&](size_t i) { return items.StoredValue(rec, fieldOf[i]).ToText(); };
+  std::string itemNo = text(5), script = text(6), category = text(7);
+  std::string out = "Quote item " + (itemNo.empty() ? std::string("(no item number)") : itemNo);
+  if (!script.empty()) out += " \"" + script + "\"";
+  if (!category.empty()) out += " (" + category + ")";
+  return out;
+}
+
+// The value stored for column `i`: converted to the column's type, so the
+// database holds only what the loaders read back. A new record's DELITEM
+// left Null is stored as False; the allow mask must be a whole number from
+// 0 to 7 or Null.
+Value StorableValue(const Value& v, size_t i) {
+  if (i == kDelItemField && v.IsNull()) return Value(false);
+  Value converted = v.ConvertTo(kItemFields[i].type);
+  if (i == kAllowField && !converted.IsNull()) {
+    int32_t mask = -1;
+    try {
+      mask = Value(converted).ToInt32();
+    } catch (const Error&) {
+    }
+    if (mask < 0 || mask > 7 || text::Trim(converted.ToText()) != std::to_string(mask))
+      throw Error(err::kTypeMismatch,
+                  "the allowed operations must be a whole number from 0 to 7, not \"" +
+                      converted.ToText() + "\"",
+                  kSource);
+  }
+  return converted;
+}
 
 double DoubleAt(const Statement& st, int i) {
   Value v = st.Column(i);
@@ -132,8 +169,29 @@ std::optional<QuoteHeader> QuoteStore::GetQuote(const std::string& qtnno) {
 }
 
 void QuoteStore::SaveQuote(const QuoteHeader& h) {
-  Statement st(*db_, std::string("INSERT OR REPLACE INTO quotes (") + kQuoteColumns +
-                         ") VALUES (?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?)");
+  // The header is saved in place: replacing the row would delete it first,
+  // and with it (through the items' foreign key) every item of the quote.
+  std::string sql = std::string("INSERT INTO quotes (") + kQuoteColumns +
+                    ") VALUES (?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?,?) "
+                    "ON CONFLICT(qtnno) DO UPDATE SET ";
+  {
+    std::string_view columns(kQuoteColumns);
+    bool first = true;
+    while (!columns.empty()) {
+      const size_t comma = columns.find(',');
+      std::string_view name = columns.substr(0, comma);
+      while (!name.empty() && name.front() == ' ')
+        name.remove_prefix(1);
+      if (name != "qtnno") {
+        if (!first) sql += ", ";
+        sql += std::string(name) + " = excluded." + std::string(name);
+        first = false;
+      }
+      if (comma == std::string_view::npos) break;
+      columns.remove_prefix(comma + 1);
+    }
+  }
+  Statement st(*db_, sql);
   int i = 1;
   for (const std::string* s : {&h.qtnno, &h.subquote, &h.customer, &h.vehicle, &h.make, &h.modelId,
                                &h.bodyId, &h.schedType, &h.schedId, &h.mtaId, &h.thirdId})
@@ -154,7 +212,42 @@ RecordsetPtr QuoteStore::NewItemRecordset() {
   return rs;
 }
 
+void QuoteStore::RenumberOutOfRangeIds(const std::string& qtnno) {
+  // Items stored with an id beyond the record set's 32-bit ITEMID (written
+  // by another program) get the next free id that fits, so the quote opens
+  // and its items can be found again by the editors.
+  Statement outside(*db_, "SELECT ITEMID FROM quote_items WHERE qtnno = ? AND "
+                          "(ITEMID > 2147483647 OR ITEMID < -2147483648)");
+  outside.BindText(1, qtnno);
+  std::vector<long long> ids;
+  while (outside.Step())
+    ids.push_back(outside.ColumnInt64(0));
+  if (ids.empty()) return;
+  Exec("BEGIN IMMEDIATE");
+  try {
+    Statement next(*db_, "SELECT COALESCE(MAX(ITEMID), 0) + 1 FROM quote_items "
+                         "WHERE ITEMID <= 2147483647");
+    Statement move(*db_, "UPDATE quote_items SET ITEMID = ? WHERE ITEMID = ?");
+    for (long long old : ids) {
+      next.Reset();
+      next.Step();
+      const long long id = next.ColumnInt64(0);
+      if (id > 2147483647LL)
+        throw Error(err::kOverflow, "The quote database has run out of item numbers", kSource);
+      move.Reset();
+      move.BindInt(1, id);
+      move.BindInt(2, old);
+      move.Step();
+    }
+    Exec("COMMIT");
+  } catch (...) {
+    sqlite3_exec(db_->Handle(), "ROLLBACK", nullptr, nullptr, nullptr);
+    throw;
+  }
+}
+
 RecordsetPtr QuoteStore::LoadItems(const std::string& qtnno, ItemKind kind) {
+  RenumberOutOfRangeIds(qtnno);
   std::string sql = "SELECT ";
   for (size_t i = 0; i < kItemFields.size(); ++i) {
     if (i) sql += ", ";
@@ -207,7 +300,7 @@ SaveSummary QuoteStore::SaveItems(const std::string& qtnno, Recordset& items) {
     values += "?";
     updateSql += std::string(kItemFields[i].name) + " = ?";
   }
-  insertSql += ") VALUES (" + values + ")";
+  insertSql += ", ITEMID) VALUES (" + values + ", ?)";
   updateSql += " WHERE ITEMID = ? AND qtnno = ?";
 
   SaveSummary summary;
@@ -220,8 +313,34 @@ SaveSummary QuoteStore::SaveItems(const std::string& qtnno, Recordset& items) {
       for (size_t i = 1; i < kItemFields.size(); ++i) {
         Value v = items.StoredValue(rec, fieldOf[i]);
         if (i == 3) v = Value(qtnno); // the quote the items belong to
-        st.Bind(static_cast<int>(i), v);
+        try {
+          st.Bind(static_cast<int>(i), StorableValue(v, i));
+        } catch (const Error& e) {
+          throw Error(e.Number(),
+                      DescribeItem(items, rec, fieldOf) + ": \"" + v.ToText() +
+                          "\" cannot be stored as its " + kItemFields[i].name + " (" +
+                          e.Description() + "). Nothing was saved.",
+                      kSource);
+        }
       }
+    };
+    // A new record gets the next id that fits the record set's 32-bit
+    // ITEMID; the store never hands out one that would be cut short.
+    Statement nextId(*db_, "SELECT COALESCE(MAX(ITEMID), 0) + 1 FROM quote_items "
+                           "WHERE ITEMID <= 2147483647");
+    auto insertNew = [&](size_t rec) {
+      nextId.Reset();
+      nextId.Step();
+      const double id = nextId.Column(0).ToDouble();
+      if (id > 2147483647.0)
+        throw Error(err::kOverflow,
+                    "The quote database has run out of item numbers; nothing was saved", kSource);
+      bindFields(insert, rec);
+      insert.Bind(static_cast<int>(kItemFields.size()), Value(static_cast<int32_t>(id)));
+      insert.Step();
+      insert.Reset();
+      assigned.emplace_back(rec, static_cast<int32_t>(id));
+      ++summary.inserted;
     };
     for (size_t rec = 0; rec < items.StoredCount(); ++rec) {
       switch (items.StoredStatus(rec)) {
@@ -229,22 +348,13 @@ SaveSummary QuoteStore::SaveItems(const std::string& qtnno, Recordset& items) {
       case RecordStatus::Discarded:
         break;
       case RecordStatus::New:
-        bindFields(insert, rec);
-        insert.Step();
-        insert.Reset();
-        assigned.emplace_back(rec, static_cast<int32_t>(sqlite3_last_insert_rowid(db_->Handle())));
-        ++summary.inserted;
+        insertNew(rec);
         break;
       case RecordStatus::Modified: {
         Value id = items.StoredOriginal(rec, idField);
         if (id.IsNull()) id = items.StoredValue(rec, idField);
         if (id.IsNull()) { // changed but never stored: store it as new
-          bindFields(insert, rec);
-          insert.Step();
-          insert.Reset();
-          assigned.emplace_back(rec,
-                                static_cast<int32_t>(sqlite3_last_insert_rowid(db_->Handle())));
-          ++summary.inserted;
+          insertNew(rec);
           break;
         }
         bindFields(update, rec);
@@ -266,8 +376,8 @@ SaveSummary QuoteStore::SaveItems(const std::string& qtnno, Recordset& items) {
         remove.Bind(1, id);
         remove.Bind(2, Value(qtnno));
         remove.Step();
+        summary.deleted += sqlite3_changes(db_->Handle());
         remove.Reset();
-        ++summary.deleted;
         break;
       }
       }

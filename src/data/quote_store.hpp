@@ -58,7 +58,7 @@ public:
 
   std::vector<QuoteHeader> ListQuotes();
   std::optional<QuoteHeader> GetQuote(const std::string& qtnno);
-  // Inserts the quote or replaces its header.
+  // Inserts the quote, or updates its header in place (its items stay).
   void SaveQuote(const QuoteHeader& header);
 
   // A new record set of the quote's items (labour: categories R&R, RA and
@@ -77,6 +77,7 @@ public:
 
 private:
   void Exec(const char* sql);
+  void RenumberOutOfRangeIds(const std::string& qtnno);
   std::unique_ptr<sqlite::Database> db_;
   std::string path_;
 };

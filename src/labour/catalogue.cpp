@@ -3,6 +3,7 @@
 
 #include "data/catalogue.hpp"
 #include "cipher/field.hpp"
+#include "editor/grid_layout.hpp"
 #include "forms/runtime.hpp"
 #include "labour/frm_labour.hpp"
 #include "text/number.hpp"
@@ -60,21 +61,23 @@ void frmLabour::LoadScheduleItems(long scheduleNo, const std::string& firstId,
   data::RecordsetPtr rs;
   data::Catalogue()->GetLabourItems(rs, scheduleNo, firstId, secondId, bodyId);
 
-  g.Redraw(false);
-  while (!rs->Eof()) {
-    const int mask = rs->Collect("allow_tick").ToInt32();
-    const std::string rr = (mask & 4) ? CatalogueHours(rs->Collect("rrhour")) : std::string();
-    const std::string pt = (mask & 1) ? CatalogueHours(rs->Collect("pthour")) : std::string();
-    g.AddItem(rs->Collect("ItemNo").ToText() + '\t' + text::Trim(rs->Collect("Script").ToText()) +
-              '\t' + rr + "\t\t" + pt + '\t' + std::to_string(mask));
-    const int last = g.Rows() - 1;
-    g.Row(last);
-    GreyByMask(g, last, mask);
-    rs->MoveNext();
+  {
+    editor::RedrawSuspended suspended(g);
+    while (!rs->Eof()) {
+      const int mask = rs->Collect("allow_tick").ToInt32();
+      const std::string rr = (mask & 4) ? CatalogueHours(rs->Collect("rrhour")) : std::string();
+      const std::string pt = (mask & 1) ? CatalogueHours(rs->Collect("pthour")) : std::string();
+      g.AddItem(rs->Collect("ItemNo").ToText() + '\t' + text::Trim(rs->Collect("Script").ToText()) +
+                '\t' + rr + "\t\t" + pt + '\t' + std::to_string(mask));
+      const int last = g.Rows() - 1;
+      g.Row(last);
+      GreyByMask(g, last, mask);
+      rs->MoveNext();
+    }
+    if (g.Rows() > 11)
+      g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - editor::kRowStepTwips);
+    if (g.Rows() > 2) g.RemoveItem(1);
   }
-  if (g.Rows() > 11) g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - 240);
-  if (g.Rows() > 2) g.RemoveItem(1);
-  g.Redraw(true);
   if (rs->State() == data::adStateOpen) rs->Close();
 }
 
@@ -139,7 +142,8 @@ void frmLabour::AddFromSourceGrid(forms::FlexGrid& source,
     sel.AddItem(rowText);
     FormatFlagCells(sel.Rows() - 1);
     if (sel.Rows() == 3 && text::Trim(sel.TextMatrix(1, col::kItemNo)).empty()) sel.RemoveItem(1);
-    if (sel.Rows() == 12) sel.ColWidth(col::kDescription, sel.ColWidth(col::kDescription) - 240);
+    if (sel.Rows() == 12)
+      sel.ColWidth(col::kDescription, sel.ColWidth(col::kDescription) - editor::kRowStepTwips);
   }
 
   const int cur = sel.Row();
@@ -201,21 +205,22 @@ void frmLabour::SearchLabourItems() {
   LayoutSearchGrid();
 
   const grid::FlexGrid& cat = FGLabourItems(k);
-  fgSearch.Redraw(false);
-  for (int i = 1; i < cat.Rows(); ++i) {
-    if (!Contains(text::UCase(cat.TextView(i, col::kItemNo)), needle) &&
-        !Contains(text::UCase(cat.TextView(i, col::kDescription)), needle))
-      continue;
-    std::string rowText;
-    for (int c = 0; c <= 5; ++c)
-      rowText += std::string(cat.TextView(i, c)) + '\t';
-    rowText += std::to_string(i);
-    fgSearch.AddItem(rowText);
-    const int last = fgSearch.Rows() - 1;
-    fgSearch.Row(last);
-    GreyByMask(fgSearch, last, MaskOf(fgSearch.TextMatrix(last, 5)));
+  {
+    editor::RedrawSuspended suspended(fgSearch);
+    for (int i = 1; i < cat.Rows(); ++i) {
+      if (!Contains(text::UCase(cat.TextView(i, col::kItemNo)), needle) &&
+          !Contains(text::UCase(cat.TextView(i, col::kDescription)), needle))
+        continue;
+      std::string rowText;
+      for (int c = 0; c <= 5; ++c)
+        rowText += std::string(cat.TextView(i, c)) + '\t';
+      rowText += std::to_string(i);
+      fgSearch.AddItem(rowText);
+      const int last = fgSearch.Rows() - 1;
+      fgSearch.Row(last);
+      GreyByMask(fgSearch, last, MaskOf(fgSearch.TextMatrix(last, 5)));
+    }
   }
-  fgSearch.Redraw(true);
 
   if (fgSearch.Rows() < 3) {
     forms::MsgBox("No labour record found", forms::msgbox::kCritical, "Labour item search");
@@ -223,7 +228,8 @@ void frmLabour::SearchLabourItems() {
   }
   fgSearch.RemoveItem(1);
   if (fgSearch.Rows() >= 11)
-    fgSearch.ColWidth(col::kDescription, fgSearch.ColWidth(col::kDescription) - 240);
+    fgSearch.ColWidth(col::kDescription,
+                      fgSearch.ColWidth(col::kDescription) - editor::kRowStepTwips);
   fgSearch.ZOrder(0);
   fgSearch.Visible(true);
   cmdBrowse.Enabled(true);

@@ -4,6 +4,9 @@
 // Enter key moves to the next cell that can be edited, and Delete removes a
 // line (remembering the ids of its stored records for the writer).
 
+#include "editor/cell_editor.hpp"
+#include "editor/grid_layout.hpp"
+#include "editor/quote_items.hpp"
 #include "forms/keys.hpp"
 #include "forms/utf8.hpp"
 #include "labour/frm_labour.hpp"
@@ -67,41 +70,7 @@ bool IsNumberKey(int keyAscii) {
   return decimal.size() == 1 && keyAscii == static_cast<unsigned char>(decimal[0]);
 }
 
-// The text without its last character (a whole UTF-8 character, so a
-// description ending in "£" never keeps half of it).
-std::string DropLastCharacter(const std::string& s) {
-  const int count = forms::utf8::CharCount(s);
-  return count == 0 ? s : s.substr(0, forms::utf8::ByteOffset(s, count - 1));
-}
-
-// Turns the grid's painting off for a scope, and on again however the scope
-// ends.
-class RedrawSuspended {
-public:
-  explicit RedrawSuspended(grid::FlexGrid& g) : grid_(g) { grid_.Redraw(false); }
-  ~RedrawSuspended() { grid_.Redraw(true); }
-  RedrawSuspended(const RedrawSuspended&) = delete;
-  RedrawSuspended& operator=(const RedrawSuspended&) = delete;
-
-private:
-  grid::FlexGrid& grid_;
-};
-
 } // namespace
-
-// ---- flag glyphs ----
-
-std::string frmLabour::ToggleFlagGlyph(const std::string& glyph) {
-  if (glyph == kTicked) return kUnticked;
-  if (glyph == kUnticked) return kTicked;
-  return "";
-}
-
-std::string frmLabour::FlagGlyphToYesNo(const std::string& glyph) {
-  if (glyph == kTicked) return "Yes";
-  if (glyph == kUnticked) return "No";
-  return "";
-}
 
 // ---- the in-cell editor ----
 
@@ -115,13 +84,7 @@ void frmLabour::OpenCellEditor(bool selectAll) {
   if (r < 1 || !(c <= col::kDescription || IsHoursColumn(c) || c == col::kRate)) return;
   if (IsGrey(g, r, c) || g.Text() == kNoRate) return;
 
-  // Reading the cell's geometry scrolls it into view first, so the editor
-  // lands on it.
-  const int left = g.Left() + g.CellLeft();
-  const int top = g.Top() + g.CellTop();
-  const int width = g.CellWidth();
-  const int height = g.CellHeight();
-  T1.Move(left, top, width, height);
+  editor::PlaceOverCurrentCell(T1, g);
 
   const std::string cellText = g.Text();
   T1.Text(cellText == kDefaultRate ? DefaultRateText() : cellText);
@@ -129,14 +92,9 @@ void frmLabour::OpenCellEditor(bool selectAll) {
   T1.Visible(true);
   if (IsHoursColumn(c) || c == col::kRate) {
     T1.Alignment(forms::kRightJustify);
-    if (selectAll) {
-      T1.SelStart(0);
-      T1.SelLength(T1.Length());
-    } else {
-      T1.SelStart(T1.Length());
-    }
+    editor::PlaceCaret(T1, selectAll);
   } else {
-    T1.SelStart(T1.Length());
+    editor::PlaceCaret(T1, false);
   }
   T1.SetFocus();
 }
@@ -148,40 +106,14 @@ void frmLabour::T1_Change() {
 }
 
 void frmLabour::T1_KeyDown(int& keyCode, int /*shift*/) {
-  grid::FlexGrid& g = FGSelectedLabour;
-  const int r = g.Row();
-  const int c = g.Col();
-  switch (keyCode) {
-  case keys::kEscape: {
+  if (keyCode == keys::kEscape) {
     // Back to the text the cell had when it was entered; the editor stays.
-    const std::string& onEntry = g.Tag();
+    const std::string& onEntry = FGSelectedLabour.Tag();
     T1.Text(onEntry == kDefaultRate ? DefaultRateText() : onEntry);
     T1.SelStart(T1.Length());
-    break;
+    return;
   }
-  case keys::kLeft:
-    if (T1.SelStart() != 0) break;
-    if (c >= 2)
-      g.Col(c - 1);
-    else if (r >= 2)
-      g.SetCurrentCell(r - 1, g.Cols() - 1);
-    break;
-  case keys::kUp:
-    if (r >= 2) g.Row(r - 1);
-    break;
-  case keys::kRight:
-    if (T1.SelStart() != T1.Length()) break;
-    if (c < g.Cols() - 1)
-      g.Col(c + 1);
-    else if (r < g.Rows() - 1)
-      g.SetCurrentCell(r + 1, col::kDescription);
-    break;
-  case keys::kDown:
-    if (r < g.Rows() - 1) g.Row(r + 1);
-    break;
-  default:
-    break;
-  }
+  editor::MoveAtTextEdges(T1, FGSelectedLabour, keyCode);
 }
 
 void frmLabour::T1_KeyPress(int& keyAscii) {
@@ -262,7 +194,7 @@ void frmLabour::CommitCellText() {
 
 void frmLabour::MoveToNextCell() {
   grid::FlexGrid& g = FGSelectedLabour;
-  RedrawSuspended suspended(g);
+  editor::RedrawSuspended suspended(g);
   const int r = g.Row();
   const int c = g.Col();
   const int lastRow = g.Rows() - 1;
@@ -298,7 +230,7 @@ void frmLabour::FGSelectedLabour_EnterCell() {
   if (r >= 1) {
     g.CellBackColor(grid::kYellow);
     if (IsFlagColumn(c))
-      g.ToolTipText(FlagCaption(c) + FlagGlyphToYesNo(g.Text()));
+      g.ToolTipText(FlagCaption(c) + editor::FlagGlyphToYesNo(g.Text()));
     else
       g.ToolTipText(g.Text());
   }
@@ -339,7 +271,7 @@ void frmLabour::FGSelectedLabour_DblClick() {
   if (meMode != eEdit || r < 1 || c > col::kMechanical || IsGrey(g, r, c)) return;
   if (IsFlagColumn(c)) {
     if (text::IsNumeric(g.TextMatrix(r, HoursOfFlag(c)))) {
-      g.Text(ToggleFlagGlyph(g.Text()));
+      g.Text(editor::ToggleFlagGlyph(g.Text()));
       FGSelectedLabour_EnterCell();
     }
     return;
@@ -369,7 +301,7 @@ void frmLabour::FGSelectedLabour_KeyPress(int& keyAscii) {
     if (cellText == kNoRate) return; // no R&R operation, nothing to edit
     // The default rate is edited as its number.
     const std::string value = cellText == kDefaultRate ? DefaultRateText() : cellText;
-    if (!value.empty()) g.Text(DropLastCharacter(value));
+    if (!value.empty()) g.Text(editor::DropLastCharacter(value));
     OpenCellEditor(false);
     return;
   }
@@ -397,7 +329,7 @@ void frmLabour::FGSelectedLabour_KeyPress(int& keyAscii) {
     OpenCellEditor(false);
   } else if (IsFlagColumn(c) && keyAscii == keys::kSpace) {
     if (!text::IsNumeric(g.TextMatrix(r, HoursOfFlag(c)))) return;
-    g.Text(ToggleFlagGlyph(g.Text()));
+    g.Text(editor::ToggleFlagGlyph(g.Text()));
     FGSelectedLabour_EnterCell();
   }
 }
@@ -412,15 +344,15 @@ void frmLabour::cmdDelete_Click() {
 
   // The row's stored records are deleted by the writer; every id is checked
   // before any is recorded, so a bad id records none of them.
-  std::vector<data::Value> ids;
+  std::vector<std::string> ids;
   for (int c : {col::kItemId1, col::kItemId2, col::kItemId3}) {
     const std::string id = g.TextMatrix(r, c);
-    if (!id.empty()) ids.push_back(data::Value(id).ConvertTo(data::DataType::Integer));
+    if (id.empty()) continue;
+    (void)data::Value(id).ConvertTo(data::DataType::Integer);
+    ids.push_back(id);
   }
-  for (const data::Value& id : ids) {
-    mrsDeletedItems->AddNew();
-    mrsDeletedItems->Collect("ITEMID", id);
-  }
+  for (const std::string& id : ids)
+    editor::AddRemovedItem(*mrsDeletedItems, id);
 
   if (r <= 1 && g.Rows() < 3) {
     // The only item: its row stays as the empty placeholder.
@@ -428,7 +360,8 @@ void frmLabour::cmdDelete_Click() {
       g.TextMatrix(1, c, "");
   } else {
     g.RemoveItem(r);
-    if (g.Rows() == 11) g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) + 240);
+    if (g.Rows() == 11)
+      g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) + editor::kRowStepTwips);
   }
   // The cell now current was not entered by a move: take its text as the one
   // Escape restores, its tool tip and highlight, as on entering it.

@@ -11,6 +11,7 @@
 //   editing.cpp    the selected grid's in-cell editor, keys, flags, delete
 
 #include "data/recordset.hpp"
+#include "editor/flag_glyphs.hpp"
 #include "forms/controls.hpp"
 #include "forms/form.hpp"
 #include "host/component_state.hpp"
@@ -19,6 +20,7 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <vector>
 
 namespace belvane::labour {
 
@@ -42,13 +44,13 @@ inline constexpr int kItemId2 = 14;
 inline constexpr int kItemId3 = 15;
 } // namespace col
 
-// Texts of the grids.
-inline constexpr const char* kTicked = "R";   // a ticked flag
-inline constexpr const char* kUnticked = "£"; // an empty flag
+// Texts of the grids. The flag glyphs are the editors' shared ones.
+using editor::kFlagFont;
+using editor::kFlagFontSize;
+using editor::kTicked;
+using editor::kUnticked;
 inline constexpr const char* kDefaultRate = "<Default>";
 inline constexpr const char* kNoRate = "<NA>";
-inline constexpr const char* kFlagFont = "Wingdings 2";
-inline constexpr double kFlagFontSize = 12;
 
 class frmLabour : public forms::Form {
 public:
@@ -96,6 +98,8 @@ public:
 protected:
   void Design() override;
   void Form_Load() override;
+  // Closing the window otherwise than by Close asks whether to keep edits.
+  void Form_QueryUnload(int& cancel, int unloadMode) override;
   void Form_Unload(int& cancel) override;
 
 private:
@@ -106,13 +110,17 @@ private:
   void EnableEditControls(bool enabled);
   void optSchedule_Click(int index);
   void cmdClose_Click();
+  // The selected grid's texts, row by row, as a snapshot to compare with.
+  std::vector<std::string> SelectedGridTexts() const;
+  // The estimator changed the lines since they were loaded (texts or
+  // deletions).
+  bool LinesEdited() const;
 
   // ---- store (store.cpp) ----
   void LoadSelectedItems();
   // Checks every row that will be written, then writes; a row that cannot
   // be written stops the writer before anything is changed.
   void WriteSelectedItems();
-  void CheckSelectedItems();
   void AddSelectedRow(const std::string& rowText);
   void GreyDisallowedCells(std::uint8_t allow);
 
@@ -134,8 +142,6 @@ private:
   void cmdBrowse_Click();
 
   // ---- editing (editing.cpp) ----
-  static std::string ToggleFlagGlyph(const std::string& glyph);
-  static std::string FlagGlyphToYesNo(const std::string& glyph);
   void OpenCellEditor(bool selectAll);
   void MoveToNextCell();
   void CommitCellText();
@@ -172,6 +178,7 @@ private:
   bool mbDefaultSched = false, mbInsurerChanged = false;
   EQuoteEditMode meMode = eView;
   std::unique_ptr<data::Recordset> mrsDeletedItems;
+  std::vector<std::string> mvLoadedLines; // the selected grid as loaded
 };
 
 // The thread's labour editor, created on first use and kept.

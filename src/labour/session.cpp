@@ -3,8 +3,10 @@
 // grid layouts, view versus edit mode, closing and unloading.
 
 #include "cipher/field.hpp"
+#include "editor/grid_layout.hpp"
+#include "editor/modal_session.hpp"
+#include "editor/quote_items.hpp"
 #include "forms/runtime.hpp"
-#include "host/frm_status.hpp"
 #include "labour/frm_labour.hpp"
 #include "text/error.hpp"
 #include "text/number.hpp"
@@ -29,36 +31,31 @@ constexpr std::array<Schedule, 4> kSchedules{{
     {"NRMA CP", "CP"},
 }};
 
-// Column titles, widths and alignments of a layout. Width -1 marks the
-// description column, sized from the others.
-struct Column {
-  const char* title;
-  int width;
-  int alignment; // -1: the grid's default
-};
+using editor::GridColumn;
+constexpr bool kBeyond = false; // a column laid beyond the description's fill
 
-constexpr std::array<Column, 6> kCatalogueColumns{{
+constexpr std::array<GridColumn, 6> kCatalogueColumns{{
     {"Item No", 800, grid::kAlignCenterCenter},
-    {"Description", -1, grid::kAlignLeftCenter},
+    {"Description", GridColumn::kFill, grid::kAlignLeftCenter},
     {"R&R", 1300, grid::kAlignRightCenter},
     {"Repair", 1300, grid::kAlignRightCenter},
     {"Paint", 1300, grid::kAlignRightCenter},
-    {"Allow", 600, grid::kAlignCenterCenter},
+    {"Allow", 600, grid::kAlignCenterCenter, kBeyond},
 }};
 
-// The search grid: the catalogue's columns and the row's index in it.
-constexpr std::array<Column, 7> SearchColumns() {
-  std::array<Column, 7> columns{};
-  for (size_t c = 0; c < kCatalogueColumns.size(); ++c)
-    columns[c] = kCatalogueColumns[c];
-  columns[6] = {"Index", 600, grid::kAlignCenterCenter};
-  return columns;
-}
-constexpr std::array<Column, 7> kSearchColumns = SearchColumns();
-
-constexpr std::array<Column, 16> kSelectedColumns{{
+constexpr std::array<GridColumn, 7> kSearchColumns{{
     {"Item No", 800, grid::kAlignCenterCenter},
-    {"Description", -1, grid::kAlignLeftCenter},
+    {"Description", GridColumn::kFill, grid::kAlignLeftCenter},
+    {"R&R", 1300, grid::kAlignRightCenter},
+    {"Repair", 1300, grid::kAlignRightCenter},
+    {"Paint", 1300, grid::kAlignRightCenter},
+    {"Allow", 600, grid::kAlignCenterCenter, kBeyond},
+    {"Index", 600, grid::kAlignCenterCenter, kBeyond},
+}};
+
+constexpr std::array<GridColumn, 16> kSelectedColumns{{
+    {"Item No", 800, grid::kAlignCenterCenter},
+    {"Description", GridColumn::kFill, grid::kAlignLeftCenter},
     {"R&R", 900, grid::kAlignRightCenter},
     {"Rpt", 500, grid::kAlignCenterCenter},
     {"Repair", 900, grid::kAlignRightCenter},
@@ -68,31 +65,12 @@ constexpr std::array<Column, 16> kSelectedColumns{{
     {"Bld", 500, grid::kAlignCenterCenter},
     {"R&R Rate", 950, grid::kAlignRightCenter},
     {"M", 500, grid::kAlignCenterCenter},
-    {"Allow", 600, grid::kAlignCenterCenter},
-    {"Rev", 600, grid::kAlignCenterCenter},
-    {"ItemID1", 800, -1},
-    {"ItemID2", 800, -1},
-    {"ItemID3", 800, -1},
+    {"Allow", 600, grid::kAlignCenterCenter, kBeyond},
+    {"Rev", 600, grid::kAlignCenterCenter, kBeyond},
+    {"ItemID1", 800, GridColumn::kDefaultAlignment, kBeyond},
+    {"ItemID2", 800, GridColumn::kDefaultAlignment, kBeyond},
+    {"ItemID3", 800, GridColumn::kDefaultAlignment, kBeyond},
 }};
-
-// Lays a grid out: column count, alignments and widths, bold titles in row
-// 0. The description column takes the grid's width less the columns before
-// the trailing ones (those up to the "Allow" column for the catalogue and
-// search grids, up to "M" for the selected grid) less 20.
-template <size_t N>
-void ApplyLayout(grid::FlexGrid& g, const std::array<Column, N>& columns, int lastSizingCol) {
-  g.Cols(static_cast<int>(N));
-  int others = 0;
-  for (int c = 0; c <= lastSizingCol; ++c)
-    if (columns[static_cast<size_t>(c)].width > 0) others += columns[static_cast<size_t>(c)].width;
-  for (int c = 0; c < static_cast<int>(N); ++c) {
-    const Column& col = columns[static_cast<size_t>(c)];
-    if (col.alignment >= 0) g.ColAlignment(c, col.alignment);
-    g.ColWidth(c, col.width > 0 ? col.width : g.Width() - others - 20);
-    g.CellFontBoldAt(0, c, true);
-    g.TextMatrix(0, c, col.title);
-  }
-}
 
 } // namespace
 
@@ -207,19 +185,14 @@ void frmLabour::SetQuoteNo(data::RecordsetPtr& prsLab, std::string& psSchedType,
                            const std::string& psMTAID, const std::string& psThirdID,
                            double pdRRRate, double pdRARate, double pdPTRate, bool pbDefaultSched,
                            bool pbInsurerChanged, EQuoteEditMode peMode) {
+  // A call made while the editor is open (a host re-entering from the
+  // editor's own session) is refused before it touches the open session.
+  editor::RefuseWhileLoaded(*this, host::gbLabourFormLoaded, "labour editor",
+                            "frmLabour.SetQuoteNo");
   if (!prsLab)
     throw Error(err::kInvalidCall, "The labour editor was given no quote item record set",
                 "frmLabour.SetQuoteNo");
-  host::frmStatus& status = host::StatusBox();
-  status.ShowStatusBox("Opening Labour...");
-  // The status box goes when the session ends, also when it ends in an
-  // error, so the hourglass never outlives the editor.
-  struct StatusGuard {
-    host::frmStatus& box;
-    ~StatusGuard() {
-      if (box.Loaded()) box.Unload();
-    }
-  } guard{status};
+  editor::StatusBoxScope status("Opening Labour...");
 
   mrsLab = prsLab;
   msQuoteNo = psQuoteNo;
@@ -238,27 +211,15 @@ void frmLabour::SetQuoteNo(data::RecordsetPtr& prsLab, std::string& psSchedType,
   mbInsurerChanged = pbInsurerChanged;
   meMode = peMode;
 
-  try {
-    Show(forms::ShowStyle::Modal);
-  } catch (...) {
-    // A session that could not run (a desktop refusing the window, say)
-    // leaves no editor loaded behind it for SaveLabourChanges to reach.
-    if (Loaded()) {
-      try {
-        Unload();
-      } catch (...) {
-      }
-    }
-    throw;
-  }
-
-  status.Unload();
+  editor::RunModalSession(*this);
+  status.Close();
   psSchedType = msSchedType;
 }
 
 void frmLabour::Form_Load() {
   try {
     mrsDeletedItems.reset(); // a list of this session's only, in edit mode only
+    mvLoadedLines.clear();
     cipher::InitFieldCipher();
     forms::Screen.MousePointer(forms::kPointerHourglass);
     host::gbLabourFormLoaded = true;
@@ -269,9 +230,7 @@ void frmLabour::Form_Load() {
     LayoutSearchGrid();
 
     if (meMode == eEdit) {
-      mrsDeletedItems = std::make_unique<data::Recordset>();
-      mrsDeletedItems->Fields().Append("ITEMID", data::DataType::Integer, 0, -1);
-      mrsDeletedItems->Open();
+      mrsDeletedItems = editor::NewRemovedItemsList();
 
       int index = mbDefaultSched ? 1 : 0;
       if (!mbInsurerChanged) {
@@ -290,6 +249,10 @@ void frmLabour::Form_Load() {
 
     LoadSelectedItems();
     FGSelectedLabour.SetCurrentCell(1, meMode == eEdit ? col::kDescription : col::kItemNo);
+    // The form is still hidden, so EnterCell did not keep the cell's text:
+    // keep it here, so Escape on the first cell brings its text back.
+    FGSelectedLabour.Tag(FGSelectedLabour.Text());
+    FGSelectedLabour.ToolTipText(FGSelectedLabour.Text());
     EnableEditControls(meMode != eView);
     forms::Screen.MousePointer(forms::kPointerDefault);
   } catch (const Error& e) {
@@ -302,15 +265,18 @@ void frmLabour::Form_Load() {
                       "\r\nSource: Belvane",
                   forms::msgbox::kCritical, "Labour form");
   }
+  // What the close box compares with: the lines as loaded, also when the
+  // load stopped part way.
+  mvLoadedLines = SelectedGridTexts();
 }
 
 void frmLabour::LayoutCatalogueGrid(int index) {
-  ApplyLayout(FGLabourItems(index), kCatalogueColumns, 4);
+  editor::ApplyLayout(FGLabourItems(index), kCatalogueColumns);
 }
 
-void frmLabour::LayoutSearchGrid() { ApplyLayout(fgSearch, kSearchColumns, 4); }
+void frmLabour::LayoutSearchGrid() { editor::ApplyLayout(fgSearch, kSearchColumns); }
 
-void frmLabour::LayoutSelectedGrid() { ApplyLayout(FGSelectedLabour, kSelectedColumns, 10); }
+void frmLabour::LayoutSelectedGrid() { editor::ApplyLayout(FGSelectedLabour, kSelectedColumns); }
 
 void frmLabour::EnableEditControls(bool enabled) {
   txtSearch.Enabled(enabled);
@@ -359,6 +325,53 @@ void frmLabour::optSchedule_Click(int index) {
 void frmLabour::cmdClose_Click() {
   if (meMode == eEdit) WriteSelectedItems();
   Unload();
+}
+
+std::vector<std::string> frmLabour::SelectedGridTexts() const {
+  const grid::FlexGrid& g = FGSelectedLabour;
+  std::vector<std::string> rows;
+  rows.reserve(static_cast<size_t>(g.Rows()));
+  for (int r = 1; r < g.Rows(); ++r) {
+    std::string row;
+    for (int c = 0; c < g.Cols(); ++c) {
+      if (c) row += '\t';
+      row += g.TextView(r, c);
+    }
+    rows.push_back(std::move(row));
+  }
+  return rows;
+}
+
+bool frmLabour::LinesEdited() const {
+  if (mrsDeletedItems && mrsDeletedItems->State() == data::adStateOpen &&
+      mrsDeletedItems->RecordCount() > 0)
+    return true;
+  return SelectedGridTexts() != mvLoadedLines;
+}
+
+void frmLabour::Form_QueryUnload(int& cancel, int unloadMode) {
+  // Only Close writes back. Closing the window any other way with edits in
+  // hand asks first, so the estimator never loses them without a word.
+  if (unloadMode == forms::kFormCode || meMode != eEdit || !Visible()) return;
+  if (T1.Visible()) CommitCellText();
+  if (!LinesEdited()) return;
+  // "No" is the default button: a session ended without an answer closes
+  // as the window's close box always did, without writing.
+  const int answer = forms::MsgBox("Save the changes to this quote's labour lines?",
+                                   forms::msgbox::kYesNoCancel | forms::msgbox::kQuestion |
+                                       forms::msgbox::kDefaultButton2,
+                                   "Labour");
+  if (answer == forms::msgbox::kCancel) {
+    cancel = 1;
+  } else if (answer == forms::msgbox::kYes) {
+    // A refused write-back keeps the editor open, and its message says why.
+    try {
+      WriteSelectedItems();
+    } catch (...) {
+      cancel = 1;
+      throw;
+    }
+  }
 }
 
 void frmLabour::Form_Unload(int& /*cancel*/) {

@@ -2,14 +2,15 @@
 // one labour line; each of its operations (R&R, repair, paint) is a record
 // of its own, whose ITEMID the row keeps in columns 13 to 15.
 
+#include "editor/grid_layout.hpp"
+#include "editor/quote_items.hpp"
+#include "forms/runtime.hpp"
 #include "labour/frm_labour.hpp"
 #include "text/error.hpp"
 #include "text/number.hpp"
 #include "text/strings.hpp"
 
-#include <algorithm>
 #include <array>
-#include <climits>
 #include <string>
 #include <vector>
 
@@ -47,23 +48,8 @@ const char* kColumnTitles[] = {"Item No", "Description", "R&R",     "Rpt",      
                                "Paint",   "Rpt",         "Bld",     "R&R Rate", "M",      "Allow",
                                "Rev",     "ItemID1",     "ItemID2", "ItemID3"};
 
-// One field write of the plan, with the grid column its value comes from
-// (-1: from the session) so a refused value can be named.
-struct FieldWrite {
-  FieldWrite(const char* f, Value v, int c) : field(f), value(std::move(v)), column(c) {}
-  const char* field;
-  Value value;
-  int column;
-};
-
-// What the writer does for one operation of one row.
-struct PlannedOperation {
-  enum class Kind { Write, Delete } kind = Kind::Write;
-  int row = 0;
-  const Operation* op = nullptr;
-  std::string id; // the record's ITEMID as the grid holds it; "" for a new record
-  std::vector<FieldWrite> writes;
-};
+using editor::FieldWrite;
+using editor::PlannedRecord;
 
 std::string Describe(const grid::FlexGrid& g, int row) {
   std::string itemNo = g.TextMatrix(row, col::kItemNo);
@@ -123,27 +109,54 @@ void frmLabour::LoadSelectedItems() {
   rs.MoveFirst();
   std::string prevItem, prevDesc;
   grid::FlexGrid& g = FGSelectedLabour;
+  std::vector<std::string> damaged;
 
   while (!rs.Eof()) {
-    const Value& tag = rs.Collect("Tag");
-    const Value& deleted = rs.Collect("DELITEM");
-    if (tag.IsNull() || deleted.IsNull() || tag.ToText() == "D" || deleted.ToBool()) {
+    if (!editor::IsShownItem(rs)) {
       rs.MoveNext();
       continue;
     }
-    const int allow = IntOr(rs.Collect("allow_tick"), 7);
-    const int report = IntOr(rs.Collect("report_on"), 0);
-    const int blend = IntOr(rs.Collect("blend"), 0);
     const std::string itemNo = rs.Collect("ItemNo").ToText();
     const std::string desc = rs.Collect("Script").ToText();
+    // A stored value that does not read as the number it should be (a
+    // quote damaged by another program) is taken as empty and named to the
+    // estimator, so one damaged line never keeps the quote from opening.
+    auto unreadable = [&](const char* what, const Value& v) {
+      damaged.push_back("Labour item " +
+                        (itemNo.empty() ? std::string("(no item number)") : itemNo) +
+                        (desc.empty() ? std::string() : " \"" + desc + "\"") + ": " + what + " \"" +
+                        v.ToText() + "\"");
+    };
+    auto readInt = [&](const char* field, int whenNull, const char* what) {
+      const Value& v = rs.Collect(field);
+      try {
+        return IntOr(v, whenNull);
+      } catch (const Error&) {
+        unreadable(what, v);
+        return whenNull;
+      }
+    };
+    auto readHours = [&](const char* field, const char* what) {
+      const Value& v = rs.Collect(field);
+      try {
+        return Hours(v);
+      } catch (const Error&) {
+        unreadable(what, v);
+        return std::string();
+      }
+    };
+    const int allow = readInt("allow_tick", 7, "allowed operations");
+    const int report = readInt("report_on", 0, "report only flag");
+    const int blend = readInt("blend", 0, "blend flag");
     const std::string category = rs.Collect("Category").ToText();
     const std::string id = rs.Collect("ITEMID").ToText();
     const std::string flag = IsTicked(report) ? kTicked : kUnticked;
 
     auto rateText = [&] {
       const Value& rate = rs.Collect("rr_rate2");
-      if (!rate.IsNull() && rate.ToDouble() == mdRRRate) return std::string(kDefaultRate);
-      return Hours(rate);
+      const std::string formatted = readHours("rr_rate2", "R&R rate");
+      if (!formatted.empty() && rate.ToDouble() == mdRRRate) return std::string(kDefaultRate);
+      return formatted;
     };
     auto mechanical = [&] {
       return text::UCase(rs.Collect("partno").ToText()) == "M" ? std::string(kTicked)
@@ -154,9 +167,9 @@ void frmLabour::LoadSelectedItems() {
     if (!continues) {
       // A new line; its row text by the category of its first record.
       std::vector<std::string> cells;
-      const std::string rr = Hours(rs.Collect("rrhour"));
-      const std::string ra = Hours(rs.Collect("rahour"));
-      const std::string pt = Hours(rs.Collect("pthour"));
+      const std::string rr = readHours("rrhour", "R&R hours");
+      const std::string ra = readHours("rahour", "repair hours");
+      const std::string pt = readHours("pthour", "paint hours");
       const std::string allowText = std::to_string(allow);
       const std::string rev = rs.Collect("rev").ToText();
       if (category == "R&R") {
@@ -187,17 +200,17 @@ void frmLabour::LoadSelectedItems() {
     } else {
       const int r = g.Rows() - 1;
       if (category == "R&R") {
-        g.TextMatrix(r, col::kRRHours, Hours(rs.Collect("rrhour")));
+        g.TextMatrix(r, col::kRRHours, readHours("rrhour", "R&R hours"));
         if (IsTicked(report)) g.TextMatrix(r, col::kRRReport, kTicked);
         g.TextMatrix(r, col::kRate, rateText());
         g.TextMatrix(r, col::kMechanical, mechanical());
         g.TextMatrix(r, col::kItemId1, id);
       } else if (category == "RA") {
-        g.TextMatrix(r, col::kRAHours, Hours(rs.Collect("rahour")));
+        g.TextMatrix(r, col::kRAHours, readHours("rahour", "repair hours"));
         if (IsTicked(report)) g.TextMatrix(r, col::kRAReport, kTicked);
         g.TextMatrix(r, col::kItemId2, id);
       } else if (category == "PAINT") {
-        g.TextMatrix(r, col::kPTHours, Hours(rs.Collect("pthour")));
+        g.TextMatrix(r, col::kPTHours, readHours("pthour", "paint hours"));
         if (IsTicked(report)) g.TextMatrix(r, col::kPTReport, kTicked);
         if (IsTicked(blend)) g.TextMatrix(r, col::kBlend, kTicked);
         g.TextMatrix(r, col::kItemId3, id);
@@ -209,16 +222,27 @@ void frmLabour::LoadSelectedItems() {
   }
 
   if (g.Rows() > 2) g.RemoveItem(1);
-  if (g.Rows() >= 11) g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - 240);
+  if (g.Rows() >= 11)
+    g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - editor::kRowStepTwips);
+
+  if (!damaged.empty()) {
+    std::string list;
+    for (const std::string& d : damaged)
+      list += "\r\n" + d;
+    forms::MsgBox("Some stored values of this quote's labour lines could not be read and are "
+                  "shown empty (an unreadable allow mask as every operation allowed):" +
+                      list + "\r\n\r\nCheck these lines; Close stores them as shown.",
+                  forms::msgbox::kExclamation, "Labour form");
+  }
 }
 
 namespace {
 
 // Builds what the writer will do for every row, in the writer's order.
-std::vector<PlannedOperation> PlanWrites(const grid::FlexGrid& g, const std::string& quoteNo,
-                                         const std::string& subQuoteNo, double rrRate,
-                                         double raRate, double ptRate) {
-  std::vector<PlannedOperation> plan;
+std::vector<PlannedRecord> PlanWrites(const grid::FlexGrid& g, const std::string& quoteNo,
+                                      const std::string& subQuoteNo, double rrRate, double raRate,
+                                      double ptRate) {
+  std::vector<PlannedRecord> plan;
   for (int r = 1; r < g.Rows(); ++r) {
     const std::string itemNo = g.TextMatrix(r, col::kItemNo);
     const std::string desc = g.TextMatrix(r, col::kDescription);
@@ -229,10 +253,11 @@ std::vector<PlannedOperation> PlanWrites(const grid::FlexGrid& g, const std::str
       const auto number = text::ParseNumber(hours);
       if (!(described && number)) {
         if ((!described || text::Trim(hours).empty()) && !id.empty())
-          plan.push_back({PlannedOperation::Kind::Delete, r, &op, id, {}});
+          plan.push_back(
+              {PlannedRecord::Kind::Delete, r, id, kColumnTitles[op.idCol], op.category, {}});
         continue;
       }
-      PlannedOperation p{PlannedOperation::Kind::Write, r, &op, id, {}};
+      PlannedRecord p{PlannedRecord::Kind::Write, r, id, kColumnTitles[op.idCol], op.category, {}};
       auto flagValue = [&](int c, std::vector<FieldWrite>& out, const char* field) {
         const std::string f = g.TextMatrix(r, c);
         if (f == kTicked)
@@ -250,13 +275,19 @@ std::vector<PlannedOperation> PlanWrites(const grid::FlexGrid& g, const std::str
       w.emplace_back(op.hoursField, Value(*number), op.hoursCol);
       flagValue(op.reportCol, w, "report_on");
       if (op.hoursCol == col::kPTHours) flagValue(col::kBlend, w, "blend");
-      w.emplace_back("allow_tick", Value(g.TextMatrix(r, col::kAllow)), col::kAllow);
+      // An empty "Allow" cell (a line typed by hand) is stored as Null,
+      // which reads back as every operation allowed.
+      const std::string allow = g.TextMatrix(r, col::kAllow);
+      w.emplace_back("allow_tick", text::Trim(allow).empty() ? Value() : Value(allow), col::kAllow);
       const std::string rev = g.TextMatrix(r, col::kRev);
       w.emplace_back("Rev", rev.empty() ? Value() : Value(rev), col::kRev);
       w.emplace_back("tag", Value(*number < 0 ? "D" : "1"), op.hoursCol);
       if (op.hoursCol == col::kRRHours) {
         const std::string rate = g.TextMatrix(r, col::kRate);
-        w.emplace_back("rr_rate2", rate == kDefaultRate ? Value(rrRate) : Value(rate), col::kRate);
+        // "<Default>", or no rate at all on a line typed by hand, is the
+        // session's R&R rate.
+        const bool sessionRate = rate == kDefaultRate || text::Trim(rate).empty();
+        w.emplace_back("rr_rate2", sessionRate ? Value(rrRate) : Value(rate), col::kRate);
         const std::string m = g.TextMatrix(r, col::kMechanical);
         if (m == kTicked)
           w.emplace_back("partno", Value("M"), col::kMechanical);
@@ -271,106 +302,46 @@ std::vector<PlannedOperation> PlanWrites(const grid::FlexGrid& g, const std::str
   return plan;
 }
 
-bool ValidId(const std::string& id) {
-  if (id.empty() || id.size() > 10) return false;
-  size_t i = id[0] == '-' ? 1 : 0;
-  if (i == id.size()) return false;
-  for (; i < id.size(); ++i)
-    if (id[i] < '0' || id[i] > '9') return false;
-  const long long v = std::stoll(id);
-  return v >= INT32_MIN && v <= INT32_MAX;
-}
-
-bool FindId(data::Recordset& rs, const std::string& id) {
-  rs.Find("ITEMID = " + id, 0, data::adSearchForward, data::adBookmarkFirst);
-  return !rs.Eof();
+// Why a cell's text cannot be stored, and what the estimator can do, in
+// the words of the grid rather than of the record set.
+std::string RefusedValueAdvice(const FieldWrite& w) {
+  const std::string value = "\"" + w.value.ToText() + "\"";
+  switch (w.column) {
+  case col::kRate:
+    return value + " in \"R&R Rate\" is not a rate. Type a rate or clear the R&R hours.";
+  case col::kRRHours:
+  case col::kRAHours:
+  case col::kPTHours:
+    return value + " in \"" + kColumnTitles[w.column] +
+           "\" is not a number of hours. Type the hours or clear the cell.";
+  case col::kAllow:
+    return value + " in \"Allow\" is not a whole number from 0 to 7. Delete the line and add "
+                   "it again from the schedule.";
+  default:
+    break;
+  }
+  if (w.column >= 0)
+    return value + " in \"" + kColumnTitles[w.column] +
+           "\" cannot be kept in the quote. Correct the cell or clear it.";
+  return "the quote cannot keep its " + std::string(w.field) + " value " + value + ".";
 }
 
 } // namespace
 
-void frmLabour::CheckSelectedItems() {
-  // Every row the writer will touch is checked first, so a row that cannot
-  // be written stops the writer before the record set has changed at all.
-  data::Recordset& rs = *mrsLab;
-  const grid::FlexGrid& g = FGSelectedLabour;
-  std::vector<std::string> removed;
-  if (mrsDeletedItems && mrsDeletedItems->State() == data::adStateOpen &&
-      mrsDeletedItems->RecordCount() > 0) {
-    for (mrsDeletedItems->MoveFirst(); !mrsDeletedItems->Eof(); mrsDeletedItems->MoveNext())
-      removed.push_back(mrsDeletedItems->Collect("ITEMID").ToText());
-  }
-  for (const PlannedOperation& p :
-       PlanWrites(g, msQuoteNo, msSubQuoteNo, mdRRRate, mdRARate, mdPTRate)) {
-    const std::string where = Describe(g, p.row);
-    if (!p.id.empty()) {
-      if (!ValidId(p.id))
-        throw Error(err::kTypeMismatch,
-                    where + ", column \"" + kColumnTitles[p.op->idCol] + "\": \"" + p.id +
-                        "\" is not a record id",
-                    "frmLabour.WriteSelectedItems");
-      const bool goneBefore = std::find(removed.begin(), removed.end(), p.id) != removed.end();
-      if (p.kind == PlannedOperation::Kind::Write && (goneBefore || !FindId(rs, p.id)))
-        throw Error(err::kNoCurrentRecord,
-                    where + ", column \"" + kColumnTitles[p.op->idCol] + "\": record " + p.id +
-                        " of the " + p.op->category + " operation is no longer in the quote",
-                    "frmLabour.WriteSelectedItems");
-    }
-    for (const FieldWrite& w : p.writes) {
-      auto index = rs.Fields().IndexOf(w.field);
-      if (!index)
-        throw Error(err::kItemNotFound,
-                    where + ": the quote's record set has no field \"" + w.field + "\"",
-                    "frmLabour.WriteSelectedItems");
-      try {
-        (void)w.value.ConvertTo(rs.Fields().Item(*index).type);
-      } catch (const Error& e) {
-        const std::string column =
-            w.column >= 0 ? std::string(", column \"") + kColumnTitles[w.column] + "\"" : "";
-        throw Error(e.Number(),
-                    where + column + ": \"" + w.value.ToText() + "\" cannot be stored in " +
-                        w.field + " (" + e.Description() + ")",
-                    "frmLabour.WriteSelectedItems");
-      }
-    }
-  }
-}
-
 void frmLabour::WriteSelectedItems() {
   data::Recordset& rs = *mrsLab;
-  CheckSelectedItems();
-
-  // Pass 1: drop the records added earlier in this session (no ITEMID), so
-  // the grid's new operations are not appended twice. Hidden records ("D")
-  // and records without a Tag stay.
-  if (rs.RecordCount() >= 1) {
-    for (rs.MoveFirst(); !rs.Eof(); rs.MoveNext()) {
-      const Value& tag = rs.Collect("Tag");
-      if (rs.Collect("ITEMID").IsNull() && !tag.IsNull() && tag.ToText() != "D") rs.Delete();
-    }
-  }
-
-  // Pass 2: the stored records whose lines the estimator deleted.
-  if (mrsDeletedItems && mrsDeletedItems->State() == data::adStateOpen &&
-      mrsDeletedItems->RecordCount() >= 1) {
-    for (mrsDeletedItems->MoveFirst(); !mrsDeletedItems->Eof(); mrsDeletedItems->MoveNext()) {
-      if (FindId(rs, mrsDeletedItems->Collect("ITEMID").ToText())) rs.Delete();
-    }
-  }
-
-  // Pass 3: the grid, one record per present operation.
-  for (const PlannedOperation& p :
-       PlanWrites(FGSelectedLabour, msQuoteNo, msSubQuoteNo, mdRRRate, mdRARate, mdPTRate)) {
-    if (p.kind == PlannedOperation::Kind::Delete) {
-      if (FindId(rs, p.id)) rs.Delete();
-      continue;
-    }
-    if (p.id.empty())
-      rs.AddNew();
-    else
-      FindId(rs, p.id);
-    for (const FieldWrite& w : p.writes)
-      rs.Collect(w.field, w.value);
-  }
+  const grid::FlexGrid& g = FGSelectedLabour;
+  const std::vector<PlannedRecord> plan =
+      PlanWrites(g, msQuoteNo, msSubQuoteNo, mdRRRate, mdRARate, mdPTRate);
+  const std::vector<std::string> removed = editor::RemovedItemIds(mrsDeletedItems.get());
+  // Every row the writer will touch is checked first, so a row that cannot
+  // be written stops the writer before the record set has changed at all.
+  editor::CheckWriteBack(rs, plan, removed,
+                         {[&g](int row) { return Describe(g, row); }, RefusedValueAdvice,
+                          "frmLabour.WriteSelectedItems"});
+  editor::DropSessionRecords(rs);     // pass 1
+  editor::ApplyRemovals(rs, removed); // pass 2
+  editor::ApplyWriteBack(rs, plan);   // pass 3: one record per present operation
 }
 
 } // namespace belvane::labour

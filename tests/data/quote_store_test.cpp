@@ -5,6 +5,8 @@
 
 #include <filesystem>
 
+#include <sqlite3.h>
+
 using namespace belvane;
 using namespace belvane::data;
 
@@ -121,4 +123,101 @@ TEST(QuoteStore, UnopenableDatabaseNamesTheFile) {
   } catch (const Error& e) {
     EXPECT_NE(e.Description().find("/nonexistent-dir/x/quotes.db"), std::string::npos);
   }
+}
+
+// Runs SQL on the quote database as another program would.
+static void RawSql(const std::string& path, const std::string& sql) {
+  sqlite3* db = nullptr;
+  ASSERT_EQ(sqlite3_open(path.c_str(), &db), SQLITE_OK);
+  char* message = nullptr;
+  const int rc = sqlite3_exec(db, sql.c_str(), nullptr, nullptr, &message);
+  const std::string why = message ? message : "";
+  sqlite3_free(message);
+  sqlite3_close(db);
+  ASSERT_EQ(rc, SQLITE_OK) << why;
+}
+
+TEST_F(QuoteStoreTest, SavingTheHeaderKeepsTheQuotesItems) {
+  auto rs = store_->LoadItems("Q100", ItemKind::All);
+  AddLabour(*rs, "100", "R&R", 1.5);
+  AddLabour(*rs, "200", "PAINT", 2.0);
+  store_->SaveItems("Q100", *rs);
+
+  auto header = *store_->GetQuote("Q100");
+  header.schedType = "MTA";
+  store_->SaveQuote(header);
+
+  EXPECT_EQ(store_->GetQuote("Q100")->schedType, "MTA");
+  EXPECT_EQ(store_->LoadItems("Q100", ItemKind::All)->RecordCount(), 2);
+}
+
+TEST_F(QuoteStoreTest, StoresOnlyWhatTheLoaderReadsBack) {
+  auto rs = store_->LoadItems("Q100", ItemKind::All);
+  AddLabour(*rs, "100", "R&R", 1.5);
+  rs->Collect("allow_tick", Value(""));
+  try {
+    store_->SaveItems("Q100", *rs);
+    FAIL() << "an allow mask of \"\" was stored";
+  } catch (const Error& e) {
+    EXPECT_NE(e.Description().find("Quote item 100 \"Item 100\" (R&R)"), std::string::npos)
+        << e.Description();
+    EXPECT_NE(e.Description().find("0 to 7"), std::string::npos) << e.Description();
+  }
+  EXPECT_EQ(store_->LoadItems("Q100", ItemKind::All)->RecordCount(), 0);
+
+  // Null is stored (read as every operation), as is a whole number; a new
+  // record whose DELITEM was never set is stored as not deleted.
+  rs->Collect("allow_tick", Value());
+  AddLabour(*rs, "200", "R&R", 1.0);
+  rs->Collect("allow_tick", Value("5"));
+  rs->Collect("DELITEM", Value());
+  EXPECT_EQ(store_->SaveItems("Q100", *rs).inserted, 2);
+  auto back = store_->LoadItems("Q100", ItemKind::All);
+  back->Find("itemno = '200'", 0, adSearchForward, adBookmarkFirst);
+  EXPECT_EQ(back->Collect("allow_tick").ToText(), "5");
+  EXPECT_FALSE(back->Collect("DELITEM").ToBool());
+}
+
+TEST_F(QuoteStoreTest, ItemIdsAlwaysFitTheRecordSet) {
+  auto rs = store_->LoadItems("Q100", ItemKind::All);
+  AddLabour(*rs, "100", "R&R", 1.5);
+  store_->SaveItems("Q100", *rs);
+  // Another program stored an item beyond the 32-bit ids: the quote still
+  // opens, with an id that fits and finds the record again.
+  RawSql(path_, "INSERT INTO quote_items (ITEMID, DELITEM, tag, qtnno, itemno, script, Category, "
+                "rrhour) VALUES (5000000000, 0, '1', 'Q100', '900', 'Big', 'R&R', 1)");
+  auto loaded = store_->LoadItems("Q100", ItemKind::All);
+  ASSERT_EQ(loaded->RecordCount(), 2);
+  loaded->Find("itemno = '900'", 0, adSearchForward, adBookmarkFirst);
+  ASSERT_FALSE(loaded->Eof());
+  const Value id = loaded->Collect("ITEMID");
+  EXPECT_EQ(id.Type(), ValueType::Long);
+  loaded->Collect("rrhour", Value(3.0));
+  EXPECT_EQ(store_->SaveItems("Q100", *loaded).updated, 1);
+
+  // New items never get an id past the 32-bit range, even after the
+  // database's own counter has gone there.
+  RawSql(path_, "INSERT INTO quote_items (ITEMID, DELITEM, tag, qtnno, Category) VALUES "
+                "(2147483647, 0, '1', 'Other', 'R&R')");
+  AddLabour(*loaded, "300", "R&R", 1.0);
+  try {
+    store_->SaveItems("Q100", *loaded);
+    FAIL() << "an id past the 32-bit range was handed out";
+  } catch (const Error& e) {
+    EXPECT_NE(e.Description().find("run out of item numbers"), std::string::npos);
+  }
+}
+
+TEST_F(QuoteStoreTest, TheSummaryCountsOnlyRecordsReallyDeleted) {
+  auto rs = store_->LoadItems("Q100", ItemKind::All);
+  AddLabour(*rs, "100", "R&R", 1.5);
+  store_->SaveItems("Q100", *rs);
+  auto mine = store_->LoadItems("Q100", ItemKind::All);
+  auto other = store_->LoadItems("Q100", ItemKind::All);
+  other->MoveFirst();
+  other->Delete();
+  EXPECT_EQ(store_->SaveItems("Q100", *other).deleted, 1);
+  mine->MoveFirst();
+  mine->Delete();
+  EXPECT_EQ(store_->SaveItems("Q100", *mine).deleted, 0);
 }

@@ -8,9 +8,9 @@
 #include "data/catalogue.hpp"
 #include "data/quote_store.hpp"
 #include "data/tools/catalogue_writer.hpp"
+#include "entry/cforms.hpp"
 #include "forms/runtime.hpp"
 #include "forms/simulated_user.hpp"
-#include "host/cforms.hpp"
 #include "labour/frm_labour.hpp"
 #include "text/error.hpp"
 

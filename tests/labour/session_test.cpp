@@ -240,7 +240,8 @@ TEST_F(SessionTest, SaveLabourChangesOnlyWhileTheEditorIsLoaded) {
     EXPECT_EQ(forms.SaveLabourChanges(), 0);
     duringSave = Records();
     f.FGSelectedLabour.TextMatrix(1, labour::col::kRRHours, "3.00");
-    // Leaving by the close box writes nothing more.
+    // Leaving by the close box, the estimator declines to save.
+    runtime.QueueAnswer(forms::msgbox::kNo);
   });
   EXPECT_EQ(duringSave, (std::vector<std::string>{"100 R&R 2"}));
   EXPECT_EQ(Records(), (std::vector<std::string>{"100 R&R 2"}));

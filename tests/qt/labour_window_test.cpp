@@ -231,3 +231,28 @@ TEST_F(LabourWindowTest, ViewModeShowsTheLinesAndTakesNoEdits) {
   for (size_t i = 0; i < quote->StoredCount(); ++i)
     EXPECT_EQ(quote->StoredStatus(i), data::RecordStatus::Unchanged);
 }
+
+TEST_F(LabourWindowTest, TheWindowsCloseButtonAsksBeforeItDiscardsEdits) {
+  AddRecord(1, "120", "L/H FRONT GUARD", "R&R", 1.0);
+  Stored();
+  QString asked;
+  OpenWindow(eEdit, [&](labour::frmLabour& form) {
+    ClickCell(form.FGSelectedLabour, 1, col::kRRHours);
+    Type("4");
+    Key(Qt::Key_Return);
+    // Cancel keeps the window and the edit.
+    Qt().QueueMessageBox([&asked](QMessageBox& box) {
+      asked = box.text();
+      box.button(QMessageBox::Cancel)->click();
+    });
+    Qt().Window(form)->close();
+    EXPECT_EQ(asked, "Save the changes to this quote's labour lines?");
+    ASSERT_TRUE(Qt().Window(form)->isVisible());
+    EXPECT_EQ(Shown(form.FGSelectedLabour, 1, col::kRRHours), "4.00");
+    // Yes writes back as Close does.
+    Qt().QueueMessageBox([](QMessageBox& box) { box.button(QMessageBox::Yes)->click(); });
+    Qt().Window(form)->close();
+  });
+  EXPECT_FALSE(host::gbLabourFormLoaded);
+  EXPECT_EQ(Records(), (std::vector<std::string>{"120 R&R 4"}));
+}

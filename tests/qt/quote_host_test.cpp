@@ -162,3 +162,21 @@ TEST_F(QuoteHostTest, AFailedStoreStoresNothingAndSaysWhy) {
   EXPECT_TRUE(window.statusBar()->currentMessage().startsWith("Q1001: nothing stored."));
   EXPECT_EQ(quote::StoredSummary(store, "Q1001").lines.size(), before.lines.size());
 }
+
+TEST_F(QuoteHostTest, AScheduleChangeKeepsTheQuotesLines) {
+  quote::QuoteWindow window(store);
+  window.show();
+  ASSERT_TRUE(window.SelectQuote("Q1001"));
+  const size_t before = quote::StoredSummary(store, "Q1001").lines.size();
+  ASSERT_GT(before, 0u);
+  runtime_->QueueModal([this](forms::Form& f) {
+    auto& form = static_cast<labour::frmLabour&>(f);
+    ASSERT_TRUE(QTest::qWaitForWindowActive(runtime_->Window(form)));
+    QTest::mouseClick(runtime_->Widget(form.optSchedule(1)), Qt::LeftButton);
+    QTest::mouseClick(runtime_->Widget(form.cmdClose), Qt::LeftButton);
+  });
+  QTest::mouseClick(window.EditLabourButton(), Qt::LeftButton);
+  EXPECT_EQ(store.GetQuote("Q1001")->schedType, "MTA");
+  EXPECT_EQ(quote::StoredSummary(store, "Q1001").lines.size(), before);
+  EXPECT_EQ(window.Lines()->rowCount(), static_cast<int>(before));
+}

@@ -1,4 +1,4 @@
-#include "host/cforms.hpp"
+#include "entry/cforms.hpp"
 
 #include "labour/frm_labour.hpp"
 
