@@ -46,11 +46,6 @@ std::string ChooseCatalogue(const std::string& named) {
 } // namespace
 
 int main(int argc, char** argv) {
-  QCoreApplication::setAttribute(Qt::AA_ShareOpenGLContexts);
-  QApplication app(argc, argv);
-  QApplication::setApplicationName("belvane-quote");
-  QApplication::setApplicationDisplayName("Belvane Quote");
-
   CLI::App cli("Belvane Quote: a desktop quoting application over a quote database, opening "
                "the labour editor on a quote and storing what changed.");
   std::string cataloguePath, quotesPath, screenshots = "belvane-quote-screenshots";
@@ -69,7 +64,16 @@ int main(int argc, char** argv) {
   cli.add_option("--screenshots", screenshots, "Folder for the scripted session's pictures")
       ->capture_default_str()
       ->type_name("DIR");
+  // Qt's own options (-platform, -style, ...) pass through to Qt. The
+  // command line is read before any window exists, so --help works without
+  // a display.
+  cli.allow_extras();
   CLI11_PARSE(cli, argc, argv);
+
+  QCoreApplication::setAttribute(Qt::AA_ShareOpenGLContexts);
+  QApplication app(argc, argv);
+  QApplication::setApplicationName("belvane-quote");
+  QApplication::setApplicationDisplayName("Belvane Quote");
 
   try {
     const std::string catalogue = ChooseCatalogue(cataloguePath);

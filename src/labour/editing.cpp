@@ -180,7 +180,10 @@ void frmLabour::CommitCellText() {
       if (hours.empty()) {
         g.TextMatrix(r, col::kRate, kNoRate);
         g.CellFontItalicAt(r, col::kRate, true);
-      } else if (g.TextMatrix(r, col::kRate) == kNoRate) {
+      } else if (const std::string rate = g.TextMatrix(r, col::kRate);
+                 rate == kNoRate || text::Trim(rate).empty()) {
+        // R&R hours on a line without a rate (one typed by hand) take the
+        // session's rate, which is what the write-back stores.
         g.TextMatrix(r, col::kRate, kDefaultRate);
         g.CellFontItalicAt(r, col::kRate, true);
       }

@@ -47,6 +47,7 @@ TEST_F(LostWorkTest, ALineTypedByHandIsStoredAndReopens) {
     user.PressKey(keys::kEnter);
     user.Type("2");
     user.PressKey(keys::kEnter);
+    EXPECT_EQ(g.TextMatrix(1, col::kRate), "<Default>");
     user.Click(f.cmdClose);
   });
   EXPECT_TRUE(runtime.UnhandledErrors().empty());
