@@ -224,3 +224,22 @@ TEST_F(CatalogueTest, BlankAndFruitlessSearches) {
 
 } // namespace
 } // namespace belvane::test
+
+namespace belvane::test {
+namespace {
+
+TEST_F(CatalogueTest, HoursThatDoNotDecipherLeaveTheListPainted) {
+  BuildCatalogue({
+      {0, "N1", "100", "BONNET R&I", "1.5", "0.8", 7},
+      {0, "N1", "110", "FRONT BUMPER BAR", std::string(16, 'Z'), "1", 7},
+  });
+  Open(eEdit, [&](frmLabour& f) {
+    EXPECT_TRUE(f.FGLabourItems(0).Redraw());
+    EXPECT_EQ(f.FGLabourItems(0).TextMatrix(2, col::kDescription), "BONNET R&I"); // kept
+  });
+  ASSERT_EQ(runtime.Messages().size(), 1u); // the load reports the failure
+  EXPECT_EQ(runtime.Messages()[0].title, "Labour form");
+}
+
+} // namespace
+} // namespace belvane::test
