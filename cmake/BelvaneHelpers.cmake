@@ -1,19 +1,18 @@
 # belvane_layer(<name> SOURCES ... DEPENDS ...)
-# One static library per layer. A layer links only the layers it may use, so
-# an include of a higher layer fails to build: the dependency rule is enforced
-# by the build rather than by review.
+# One layer: its objects are compiled once (belvane_<name>_objects) and make
+# both the static library the build links (belvane_<name>, linking only the
+# layers below it) and, for the headless layers, the shared library a host
+# links (Belvane::belvane, see BelvanePackage.cmake).
 function(belvane_layer name)
   cmake_parse_arguments(L "" "" "SOURCES;DEPENDS;PRIVATE_DEPENDS" ${ARGN})
-  add_library(belvane_${name} STATIC ${L_SOURCES})
-  target_include_directories(belvane_${name} PUBLIC
-    $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/src>
-    $<INSTALL_INTERFACE:include/belvane/internal>)
-  target_link_libraries(belvane_${name} PUBLIC ${L_DEPENDS}
-                        PRIVATE $<BUILD_INTERFACE:belvane_warnings> ${L_PRIVATE_DEPENDS})
+  add_library(belvane_${name}_objects OBJECT ${L_SOURCES})
+  target_include_directories(belvane_${name}_objects PUBLIC ${PROJECT_SOURCE_DIR}/src)
+  target_link_libraries(belvane_${name}_objects PUBLIC ${L_DEPENDS}
+                        PRIVATE belvane_warnings ${L_PRIVATE_DEPENDS})
+  add_library(belvane_${name} STATIC $<TARGET_OBJECTS:belvane_${name}_objects>)
+  target_include_directories(belvane_${name} PUBLIC ${PROJECT_SOURCE_DIR}/src)
+  target_link_libraries(belvane_${name} PUBLIC ${L_DEPENDS} PRIVATE ${L_PRIVATE_DEPENDS})
   set_property(GLOBAL APPEND PROPERTY BELVANE_LAYERS belvane_${name})
-  install(TARGETS belvane_${name} EXPORT BelvaneTargets ARCHIVE DESTINATION lib)
-  install(DIRECTORY ${CMAKE_CURRENT_SOURCE_DIR}/ DESTINATION include/belvane/internal/${name}
-          FILES_MATCHING PATTERN "*.hpp" PATTERN "tools" EXCLUDE)
 endfunction()
 
 # belvane_test(<name> SOURCES ... DEPENDS ...)

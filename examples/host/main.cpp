@@ -11,10 +11,10 @@
 #include <belvane/belvane.hpp>
 
 // The scripted estimator (headless sessions only).
-#include "forms/controls.hpp"
-#include "forms/form.hpp"
-#include "forms/keys.hpp"
-#include "forms/simulated_user.hpp"
+#include <belvane/forms/controls.hpp>
+#include <belvane/forms/form.hpp>
+#include <belvane/forms/keys.hpp>
+#include <belvane/forms/simulated_user.hpp>
 
 #include <exception>
 #include <iostream>

@@ -10,6 +10,10 @@
 
 namespace belvane::host {
 
+// The messages the editors show in the status box while they open.
+inline constexpr const char* kOpeningLabour = "Opening Labour...";
+inline constexpr const char* kOpeningParts = "Opening Parts...";
+
 class frmStatus : public forms::Form {
 public:
   forms::Frame frStatus{*this, "frStatus"};

@@ -7,6 +7,7 @@
 #include "editor/modal_session.hpp"
 #include "editor/quote_items.hpp"
 #include "forms/runtime.hpp"
+#include "host/frm_status.hpp"
 #include "labour/frm_labour.hpp"
 #include "text/error.hpp"
 #include "text/number.hpp"
@@ -192,7 +193,7 @@ void frmLabour::SetQuoteNo(data::RecordsetPtr& prsLab, std::string& psSchedType,
   if (!prsLab)
     throw Error(err::kInvalidCall, "The labour editor was given no quote item record set",
                 "frmLabour.SetQuoteNo");
-  editor::StatusBoxScope status("Opening Labour...");
+  editor::StatusBoxScope status(host::kOpeningLabour);
 
   mrsLab = prsLab;
   msQuoteNo = psQuoteNo;

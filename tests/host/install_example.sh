@@ -1,7 +1,8 @@
 #!/bin/sh
 # Installs a Belvane build tree into a fresh prefix, builds the example host
-# against the installed package alone, runs it on the sample catalogue and
-# checks what it printed. The work folder is the same on every run, so that
+# against the installed package alone (with Qt, PostgreSQL and SQLite kept
+# out of its configure step: a headless host needs none of them), runs it
+# on the sample catalogue and checks what it printed. The work folder is the same on every run, so that
 # ccache finds the example's object from the run before.
 set -eu
 
@@ -36,13 +37,26 @@ cmake --install "$tree" ${config:+--config "$config"} --prefix "$prefix" >"$work
   cat "$work/install.log" >&2; fail "cmake --install"; }
 # The host builds against the prefix only: nothing of the source tree.
 test -f "$prefix/include/belvane/belvane.hpp" || fail "no public header installed"
+test -f "$prefix/include/belvane/labour/frm_labour.hpp" || fail "the editors' headers are not installed"
 test -f "$prefix/lib/cmake/Belvane/BelvaneConfig.cmake" || fail "no package config installed"
+test -x "$prefix/bin/belvane" || fail "the command-line tool is not installed"
+# Only belvane/ lands on a host's include path, and the headers include one
+# another as <belvane/...>.
+for generic in text data grid forms host labour; do
+  test ! -e "$prefix/include/$generic" || fail "include/$generic installed beside include/belvane"
+done
+if grep -rqE '#include "(text|data|grid|forms|cipher|host|editor|labour|entry)/' "$prefix/include/belvane"; then
+  fail "an installed header includes another by its source-tree path"
+fi
 
 cmake -S "$example" -B "$work/build" -G "$generator" \
   -DCMAKE_PREFIX_PATH="$prefix" \
   -DCMAKE_CXX_COMPILER="$cxx" \
   -DCMAKE_CXX_COMPILER_LAUNCHER="$launcher" \
   -DCMAKE_BUILD_TYPE="$config" \
+  -DCMAKE_DISABLE_FIND_PACKAGE_Qt6=ON \
+  -DCMAKE_DISABLE_FIND_PACKAGE_PostgreSQL=ON \
+  -DCMAKE_DISABLE_FIND_PACKAGE_SQLite3=ON \
   -DCMAKE_CXX_FLAGS="$flags" \
   -DCMAKE_EXE_LINKER_FLAGS="$flags" >"$work/configure.log" 2>&1 || {
   cat "$work/configure.log" >&2; fail "configuring the example against the package"; }
