@@ -3,6 +3,7 @@
 // control_Event connected in the constructor, and a test that drives it
 // only through a modal show and the simulated user.
 
+#include "editor/cell_editor.hpp"
 #include "forms/controls.hpp"
 #include "forms/form.hpp"
 #include "forms/keys.hpp"
@@ -72,16 +73,10 @@ protected:
 private:
   void OpenCellEditor(bool selectAll) {
     if (fgLines.Row() < 1) return;
-    T1.Move(fgLines.Left() + fgLines.CellLeft(), fgLines.Top() + fgLines.CellTop(),
-            fgLines.CellWidth(), fgLines.CellHeight());
+    belvane::editor::PlaceOverCurrentCell(T1, fgLines);
     T1.Text(fgLines.Text());
     T1.Visible(true);
-    if (selectAll) {
-      T1.SelStart(0);
-      T1.SelLength(T1.Length());
-    } else {
-      T1.SelStart(T1.Length());
-    }
+    belvane::editor::PlaceCaret(T1, selectAll);
     T1.SetFocus();
   }
 

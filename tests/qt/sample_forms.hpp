@@ -4,6 +4,7 @@
 // flag cells drawn as boxes, a note box, a check box and a Close button)
 // and a small status box.
 
+#include "editor/cell_editor.hpp"
 #include "forms/controls.hpp"
 #include "forms/form.hpp"
 #include "forms/keys.hpp"
@@ -58,17 +59,11 @@ public:
 
   void OpenCellEditor(bool selectAll) {
     if (fgLines.Row() < 1 || fgLines.Col() == kColFlag || fgLines.Col() == kColItem) return;
-    T1.Move(fgLines.Left() + fgLines.CellLeft(), fgLines.Top() + fgLines.CellTop(),
-            fgLines.CellWidth(), fgLines.CellHeight());
+    editor::PlaceOverCurrentCell(T1, fgLines);
     T1.Text(fgLines.Text());
     T1.Visible(true);
     T1.ZOrder(0);
-    if (selectAll) {
-      T1.SelStart(0);
-      T1.SelLength(T1.Length());
-    } else {
-      T1.SelStart(T1.Length());
-    }
+    editor::PlaceCaret(T1, selectAll);
     T1.SetFocus();
   }
 
