@@ -1,6 +1,7 @@
 #include "quote_summary.hpp"
 
 #include "text/number.hpp"
+#include "text/strings.hpp"
 
 namespace belvane::quote {
 
@@ -54,6 +55,53 @@ QuoteSummary Summarize(data::Recordset& items, const data::QuoteHeader& quote) {
     summary.lines.push_back(std::move(line));
   }
   return summary;
+}
+
+std::string PartTypeName(const std::string& letter) {
+  const std::string t = text::UCase(text::Trim(letter));
+  if (t.empty()) return "New";
+  if (t == "U") return "Used";
+  if (t == "X") return "Exchange";
+  if (t == "C") return "Recore";
+  if (t == "A") return "After market";
+  return t;
+}
+
+PartsSummary SummarizeParts(data::Recordset& items) {
+  PartsSummary summary;
+  if (items.RecordCount() == 0) return summary;
+  auto number = [&items](const char* field) {
+    const data::Value& v = items.Collect(field);
+    return v.IsNull() ? 0.0 : v.ToDouble();
+  };
+  for (items.MoveFirst(); !items.Eof(); items.MoveNext()) {
+    const data::Value& deleted = items.Collect("DELITEM");
+    if ((!deleted.IsNull() && deleted.ToBool()) || items.Collect("tag").ToText() == "D") continue;
+    if (items.Collect("Category").ToText() != "PRT") continue;
+    PartLine line;
+    line.itemNo = items.Collect("itemno").ToText();
+    line.description = items.Collect("script").ToText();
+    line.type = PartTypeName(items.Collect("mark").ToText());
+    line.qty = number("qty");
+    line.unitCost = number("unitcost");
+    line.price = number("rrhour");
+    const data::Value& report = items.Collect("report_on");
+    line.reportOnly = !report.IsNull() && report.ToInt32() == 1;
+    if (!line.reportOnly) {
+      line.cost = line.qty * line.unitCost;
+      line.sell = line.qty * line.price;
+      summary.cost += line.cost;
+      summary.sell += line.sell;
+    }
+    summary.lines.push_back(std::move(line));
+  }
+  return summary;
+}
+
+PartsSummary StoredPartsSummary(data::QuoteStore& store, const std::string& qtnno) {
+  if (!store.GetQuote(qtnno)) return {};
+  data::RecordsetPtr items = store.LoadItems(qtnno, data::ItemKind::Parts);
+  return SummarizeParts(*items);
 }
 
 } // namespace belvane::quote

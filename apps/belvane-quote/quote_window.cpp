@@ -4,6 +4,7 @@
 #include "entry/cforms.hpp"
 #include "quote_summary.hpp"
 #include "text/error.hpp"
+#include "text/number.hpp"
 
 #include <QHBoxLayout>
 #include <QHeaderView>
@@ -40,6 +41,10 @@ QTableWidgetItem* Cell(const QString& text, bool number = false) {
   if (number) item->setTextAlignment(Qt::AlignRight | Qt::AlignVCenter);
   return item;
 }
+
+// The rows of the totals: the three labour categories, labour, the parts at
+// cost and with markup, their margin, and the quote's total.
+constexpr int kTotalRows = 8;
 
 QLabel* Heading(const QString& text, QWidget* parent) {
   auto* label = new QLabel(text, parent);
@@ -106,13 +111,20 @@ QuoteWindow::QuoteWindow(data::QuoteStore& store, QWidget* parent)
   lines_->horizontalHeader()->setSectionResizeMode(1, QHeaderView::Stretch);
   lines_->setSelectionMode(QAbstractItemView::NoSelection);
   rightLayout->addWidget(lines_, 1);
+  rightLayout->addWidget(Heading("Parts", right));
+  parts_ = MakeTable({"Item No", "Description", "Type", "Qty", "Unit cost", "Price", "Line total"},
+                     right);
+  parts_->horizontalHeader()->setSectionResizeMode(QHeaderView::ResizeToContents);
+  parts_->horizontalHeader()->setSectionResizeMode(1, QHeaderView::Stretch);
+  parts_->setSelectionMode(QAbstractItemView::NoSelection);
+  rightLayout->addWidget(parts_, 1);
   rightLayout->addWidget(Heading("Totals", right));
   totals_ = MakeTable({"Category", "Hours", "Amount"}, right);
   totals_->setSelectionMode(QAbstractItemView::NoSelection);
   totals_->horizontalHeader()->setSectionResizeMode(0, QHeaderView::Stretch);
-  totals_->setRowCount(4);
+  totals_->setRowCount(kTotalRows);
   totals_->setFixedHeight(totals_->horizontalHeader()->height() +
-                          4 * totals_->verticalHeader()->defaultSectionSize() + 4);
+                          kTotalRows * totals_->verticalHeader()->defaultSectionSize() + 4);
   rightLayout->addWidget(totals_);
 
   splitter->addWidget(left);
@@ -121,7 +133,7 @@ QuoteWindow::QuoteWindow(data::QuoteStore& store, QWidget* parent)
   splitter->setStretchFactor(1, 3);
   splitter->setSizes({500, 640});
   setCentralWidget(splitter);
-  resize(1140, 620);
+  resize(1140, 760);
 
   connect(quotes_, &QTableWidget::itemSelectionChanged, this, [this] { ShowQuote(); });
   connect(quotes_, &QTableWidget::cellDoubleClicked, this, [this] { OpenLabour(eEdit); });
@@ -170,6 +182,7 @@ void QuoteWindow::ShowQuote() {
   editLabour_->setEnabled(header.has_value());
   viewLabour_->setEnabled(header.has_value());
   lines_->setRowCount(0);
+  parts_->setRowCount(0);
   if (!header) {
     title_->setText("No quote selected");
     vehicle_->clear();
@@ -199,14 +212,40 @@ void QuoteWindow::ShowQuote() {
     totals_->setItem(c, 1, Cell(Q(Hours(summary.hours[static_cast<size_t>(c)])), true));
     totals_->setItem(c, 2, Cell(Q(Hours(summary.amounts[static_cast<size_t>(c)])), true));
   }
-  totals_->setItem(3, 0, Cell("Total"));
+  totals_->setItem(3, 0, Cell("Labour"));
   totals_->setItem(3, 1, Cell(Q(Hours(summary.TotalHours())), true));
   totals_->setItem(3, 2, Cell(Q(Hours(summary.TotalAmount())), true));
-  for (int c = 0; c < 3; ++c) {
-    QFont bold = totals_->item(3, c)->font();
-    bold.setBold(true);
-    totals_->item(3, c)->setFont(bold);
+
+  const PartsSummary parts = StoredPartsSummary(store_, header->qtnno);
+  parts_->setRowCount(static_cast<int>(parts.lines.size()));
+  for (int r = 0; r < static_cast<int>(parts.lines.size()); ++r) {
+    const PartLine& part = parts.lines[static_cast<size_t>(r)];
+    parts_->setItem(r, 0, Cell(Q(part.itemNo)));
+    parts_->setItem(r, 1, Cell(Q(part.description)));
+    parts_->setItem(r, 2, Cell(Q(part.type)));
+    parts_->setItem(r, 3, Cell(QString::number(part.qty), true));
+    parts_->setItem(r, 4, Cell(Q(Hours(part.unitCost)), true));
+    parts_->setItem(r, 5, Cell(Q(text::FormatNumber(part.price, text::kPrice)), true));
+    parts_->setItem(r, 6, Cell(part.reportOnly ? "report only" : Q(Hours(part.sell)), true));
   }
+  const std::pair<const char*, double> partRows[] = {
+      {"Parts at cost", parts.cost},
+      {"Parts with markup", parts.sell},
+      {"Parts margin", parts.Margin()},
+      {"Quote total", summary.TotalAmount() + parts.sell}};
+  int row = 4;
+  for (const auto& [name, amount] : partRows) {
+    totals_->setItem(row, 0, Cell(name));
+    totals_->setItem(row, 1, Cell(""));
+    totals_->setItem(row, 2, Cell(Q(Hours(amount)), true));
+    ++row;
+  }
+  for (int r : {3, kTotalRows - 1})
+    for (int c = 0; c < 3; ++c) {
+      QFont bold = totals_->item(r, c)->font();
+      bold.setBold(true);
+      totals_->item(r, c)->setFont(bold);
+    }
 }
 
 void QuoteWindow::Report(const std::string& message) { statusBar()->showMessage(Q(message)); }

@@ -1,8 +1,9 @@
 #pragma once
 // The demo host's main window: the quotes of the database with their
 // vehicles, the selected quote's context, buttons that open the labour
-// editor in edit or view mode, and the quote's labour lines and totals,
-// read again from the database after each edit.
+// editor in edit or view mode, and the quote's labour lines, parts and
+// totals (labour, parts at cost and with markup, margin), read again from
+// the database after each edit.
 //
 // An edit runs as a host does it: the quote's items are loaded into a
 // record set, CForms opens the editor over it (blocking until the
@@ -45,6 +46,7 @@ public:
   QPushButton* ViewLabourButton() const noexcept { return viewLabour_; }
   QTableWidget* QuoteList() const noexcept { return quotes_; }
   QTableWidget* Lines() const noexcept { return lines_; }
+  QTableWidget* Parts() const noexcept { return parts_; }
   QTableWidget* Totals() const noexcept { return totals_; }
 
 private:
@@ -63,6 +65,7 @@ private:
   QPushButton* editParts_;
   QPushButton* viewParts_;
   QTableWidget* lines_;
+  QTableWidget* parts_;
   QTableWidget* totals_;
 };
 

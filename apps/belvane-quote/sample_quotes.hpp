@@ -1,7 +1,8 @@
 #pragma once
 // The demo's sample quotes: on first run an empty quote database gets a few
 // quotes on vehicles of the catalogue, some with labour lines taken from the
-// catalogue's NRMA schedule.
+// catalogue's NRMA schedule and parts of every type from the vehicle's parts
+// catalogue, some priced with the markups in force before.
 
 #include "data/quote_store.hpp"
 

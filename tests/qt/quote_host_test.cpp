@@ -23,6 +23,7 @@
 #include <sqlite3.h>
 
 #include <optional>
+#include <set>
 
 using namespace belvane;
 namespace col = belvane::labour::col;
@@ -179,4 +180,28 @@ TEST_F(QuoteHostTest, AScheduleChangeKeepsTheQuotesLines) {
   EXPECT_EQ(store.GetQuote("Q1001")->schedType, "MTA");
   EXPECT_EQ(quote::StoredSummary(store, "Q1001").lines.size(), before);
   EXPECT_EQ(window.Lines()->rowCount(), static_cast<int>(before));
+}
+
+TEST_F(QuoteHostTest, SampleQuotesCarryPartsOfEveryTypeAndTheTotalsAddThem) {
+  const quote::PartsSummary parts = quote::StoredPartsSummary(store, "Q1001");
+  ASSERT_EQ(parts.lines.size(), 5u);
+  std::set<std::string> types;
+  double cost = 0, sell = 0;
+  for (const auto& p : parts.lines) {
+    types.insert(p.type);
+    cost += p.qty * p.unitCost;
+    sell += p.qty * p.price;
+  }
+  EXPECT_EQ(types, (std::set<std::string>{"New", "Used", "Exchange", "Recore", "After market"}));
+  EXPECT_DOUBLE_EQ(parts.cost, cost);
+  EXPECT_DOUBLE_EQ(parts.sell, sell);
+
+  quote::QuoteWindow window(store);
+  ASSERT_TRUE(window.SelectQuote("Q1001"));
+  EXPECT_EQ(window.Parts()->rowCount(), 5);
+  const quote::QuoteSummary labour = quote::StoredSummary(store, "Q1001");
+  QTableWidget* totals = window.Totals();
+  EXPECT_EQ(totals->item(6, 0)->text(), "Parts margin");
+  EXPECT_EQ(totals->item(6, 2)->text().toStdString(), quote::Hours(sell - cost));
+  EXPECT_EQ(totals->item(7, 2)->text().toStdString(), quote::Hours(labour.TotalAmount() + sell));
 }
