@@ -25,7 +25,7 @@ namespace belvane::diagram {
 
 namespace {
 
-using Json = nlohmann::json;
+using Json = nlohmann::ordered_json; // keys keep the order they were written in
 
 constexpr const char* kFormat = "belvane-settings-1";
 
