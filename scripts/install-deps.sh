@@ -8,7 +8,7 @@ PACKAGES=(
   build-essential cmake ninja-build ccache pkg-config
   clang-format
   libgtest-dev libgmock-dev libbenchmark-dev
-  libfmt-dev libcli11-dev
+  libfmt-dev libcli11-dev nlohmann-json3-dev
   libsqlite3-dev sqlite3 libssl-dev
   libpq-dev postgresql
   qt6-base-dev qt6-webengine-dev libgl-dev

@@ -15,5 +15,6 @@ using RegisterFn = void (*)(CLI::App& app, int& exitCode);
 void RegisterVersion(CLI::App& app, int& exitCode);
 void RegisterField(CLI::App& app, int& exitCode);
 void RegisterCatalogue(CLI::App& app, int& exitCode);
+void RegisterSettings(CLI::App& app, int& exitCode);
 
 } // namespace belvane::cli

@@ -29,6 +29,7 @@ int main(int argc, char** argv) {
       RegisterVersion,
       RegisterField,
       RegisterCatalogue,
+      RegisterSettings,
   };
   for (RegisterFn fn : groups)
     fn(app, exitCode);

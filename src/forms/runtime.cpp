@@ -2,6 +2,7 @@
 
 #include "forms/form.hpp"
 #include "forms/input.hpp"
+#include "forms/page_host.hpp"
 #include "forms/windows.hpp"
 
 #include <utility>
@@ -86,6 +87,8 @@ void HeadlessRuntime::RunModal(Form& form) {
     Input::CloseBox(form);
     if (form.Visible()) form.Hide();
   };
+  // The message loop runs: pages the form started loading arrive.
+  PageHost::CompletePending();
   if (!scripts_.empty()) {
     Script script = std::move(scripts_.front());
     scripts_.pop_front();
@@ -98,6 +101,11 @@ void HeadlessRuntime::RunModal(Form& form) {
     }
   }
   closeLeftOpen();
+}
+
+void HeadlessRuntime::DoEvents() {
+  ++doEvents_;
+  PageHost::CompletePending();
 }
 
 int HeadlessRuntime::MessageBox(const std::string& prompt, int style, const std::string& title) {

@@ -7,7 +7,9 @@
 //
 // The HeadlessRuntime plays scripted sessions: each queued script plays the
 // user for the next modal Show; a form its script leaves open is closed as
-// by the window's close box. It records message boxes (answering queued
+// by the window's close box. Where its message loop would run (a modal
+// session starting, DoEvents) it completes the pending page loads of web
+// browsers through the page host (page_host.hpp). It records message boxes (answering queued
 // answers, else the default button), mouse pointer changes, DoEvents calls
 // and the errors that ended event handlers run by user input.
 
@@ -113,7 +115,7 @@ public:
 
   void RunModal(Form& form) override;
   int MessageBox(const std::string& prompt, int style, const std::string& title) override;
-  void DoEvents() override { ++doEvents_; }
+  void DoEvents() override;
   void MousePointerChanged(int pointer) override { pointers_.push_back(pointer); }
   void UnhandledError(const std::string& where, long number,
                       const std::string& description) override;

@@ -3,6 +3,7 @@
 #include "forms/controls.hpp"
 #include "forms/form.hpp"
 #include "forms/input.hpp"
+#include "forms/page_host.hpp"
 #include "forms/utf8.hpp"
 
 #include <algorithm>
@@ -144,5 +145,15 @@ bool SimulatedUser::ScrollGrid(FlexGrid& grid, int topRow, int leftCol) {
 }
 
 bool SimulatedUser::Close(Form& form) { return Input::CloseBox(form); }
+
+bool SimulatedUser::ClickOnPage(WebBrowser& browser, std::string_view nameOrId) {
+  return PageHost::Click(browser, nameOrId);
+}
+
+bool SimulatedUser::PickGroupOnPage(WebBrowser& browser, std::string_view group) {
+  return PageHost::PickGroup(browser, group);
+}
+
+bool SimulatedUser::CancelPage(WebBrowser& browser) { return PageHost::Cancel(browser); }
 
 } // namespace belvane::forms

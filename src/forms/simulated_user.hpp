@@ -15,6 +15,7 @@ class Control;
 class FlexGrid;
 class Form;
 class ListView;
+class WebBrowser;
 
 class SimulatedUser {
 public:
@@ -39,6 +40,13 @@ public:
   bool ScrollGrid(FlexGrid& grid, int topRow, int leftCol = -1);
   // The window's close box.
   bool Close(Form& form);
+
+  // Clicks on the page a web browser shows (headless, through the page host,
+  // which plays the page's script: page_host.hpp). By element id or name; the
+  // panel or button of a group; the page's cancel button.
+  bool ClickOnPage(WebBrowser& browser, std::string_view nameOrId);
+  bool PickGroupOnPage(WebBrowser& browser, std::string_view group);
+  bool CancelPage(WebBrowser& browser);
 
 private:
   bool ClickAt(Control& control, int x, int y, int button, int shift);
