@@ -53,8 +53,15 @@ void CommandButton::Caption(std::string caption) {
   NotifyProperty(grid::Property::Caption);
 }
 
+void CommandButton::Picture(std::string picture) {
+  picture_ = std::move(picture);
+  NotifyProperty(grid::Property::Picture);
+}
+
 void CommandButton::ResetState() {
   caption_.clear();
+  picture_.clear();
+  NotifyProperty(grid::Property::Picture);
   spaceDown_ = false;
   ResetCommon();
   NotifyProperty(grid::Property::Caption);

@@ -102,6 +102,10 @@ public:
   CommandButton(Form& form, std::string name, int index = -1);
   const std::string& Caption() const noexcept { return caption_; }
   void Caption(std::string caption);
+  // The button's picture, drawn beside or instead of its caption: one of the
+  // pictures the views know (kPicture...) or the path of an image file.
+  const std::string& Picture() const noexcept { return picture_; }
+  void Picture(std::string picture);
 
 protected:
   void ResetState() override;
@@ -111,8 +115,15 @@ protected:
 
 private:
   std::string caption_;
+  std::string picture_;
   bool spaceDown_ = false;
 };
+
+// The pictures every view draws for a button: a search, a way back to a
+// list, and the arrow of a drop-down.
+inline constexpr const char* kPictureSearch = "search";
+inline constexpr const char* kPictureBrowse = "browse";
+inline constexpr const char* kPictureDropDown = "dropdown";
 
 class CheckBox : public ControlOf<grid::ControlModel> {
 public:

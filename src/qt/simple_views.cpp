@@ -19,6 +19,7 @@
 #include <QPainter>
 #include <QPushButton>
 #include <QRadioButton>
+#include <QStyle>
 
 #include <limits>
 
@@ -98,11 +99,24 @@ public:
   void SyncAll() override {
     ControlView::SyncAll();
     Sync(grid::Property::Caption);
+    Sync(grid::Property::Picture);
   }
 
 protected:
   void Sync(grid::Property property) override {
     if (property == grid::Property::Caption) widget_->setText(ToQString(button_.Caption()));
+    if (property == grid::Property::Picture) widget_->setIcon(PictureIcon(button_.Picture()));
+  }
+  // The pictures the model names, drawn with the desktop style's own icons;
+  // any other name is an image file.
+  QIcon PictureIcon(const std::string& picture) const {
+    if (picture.empty()) return {};
+    QStyle* style = widget_->style();
+    if (picture == forms::kPictureSearch)
+      return style->standardIcon(QStyle::SP_FileDialogContentsView);
+    if (picture == forms::kPictureBrowse) return style->standardIcon(QStyle::SP_ArrowBack);
+    if (picture == forms::kPictureDropDown) return style->standardIcon(QStyle::SP_ArrowDown);
+    return QIcon(ToQString(picture));
   }
   // The button looks pressed while the mouse button is down on it.
   bool Mouse(QWidget* source, QMouseEvent* event) override {

@@ -7,6 +7,7 @@
 #include "qt/list_view.hpp"
 
 #include <QGroupBox>
+#include <QPushButton>
 #include <QRadioButton>
 
 using namespace belvane::qt;
@@ -48,7 +49,7 @@ protected:
     ScaleWidth(4800);
     ScaleHeight(3000);
     txtType.Move(120, 120, 1815, 285);
-    CB1.Caption("v");
+    CB1.Picture(belvane::forms::kPictureDropDown);
     CB1.Move(1935, 120, 285, 285);
     LV1.Visible(false);
     LV1.ColumnHeaderText("Part type");
@@ -72,6 +73,8 @@ TEST_F(QtFormsTest, TheListDropsDownWhereTheFormPutsItAndTakesClicksAndKeys) {
     auto* list = dynamic_cast<ListViewView*>(Runtime().View(form.LV1));
     ASSERT_NE(list, nullptr);
     EXPECT_FALSE(list->Widget()->isVisible());
+    // The drop-down button shows its picture.
+    EXPECT_FALSE(qobject_cast<QPushButton*>(WidgetOf(form.CB1))->icon().isNull());
     Click(form.CB1);
     ASSERT_TRUE(list->Widget()->isVisible());
     // Right under the text box, in front of everything else.
