@@ -5,6 +5,7 @@
 // line (remembering the ids of its stored records for the writer).
 
 #include "editor/cell_editor.hpp"
+#include "editor/deletion_history.hpp"
 #include "editor/grid_layout.hpp"
 #include "editor/quote_items.hpp"
 #include "forms/keys.hpp"
@@ -282,11 +283,18 @@ void frmLabour::FGSelectedLabour_DblClick() {
   OpenCellEditor(true);
 }
 
-void frmLabour::FGSelectedLabour_KeyDown(int& keyCode, int /*shift*/) {
+void frmLabour::FGSelectedLabour_KeyDown(int& keyCode, int shift) {
   grid::FlexGrid& g = FGSelectedLabour;
   const int r = g.Row();
   const int c = g.Col();
-  if (meMode != eEdit || keyCode != keys::kF2) return;
+  if (meMode != eEdit) return;
+  if (shift & forms::kCtrlMask) {
+    // Ctrl+Z takes back the last deletion, Ctrl+Y does it again.
+    if (keyCode == 'Z') UndoDeletion();
+    if (keyCode == 'Y') RedoDeletion();
+    return;
+  }
+  if (keyCode != keys::kF2) return;
   if (r < 1 || c > col::kMechanical || IsGrey(g, r, c) || IsFlagColumn(c)) return;
   OpenCellEditor(IsHoursColumn(c));
 }
@@ -340,10 +348,13 @@ void frmLabour::FGSelectedLabour_KeyPress(int& keyAscii) {
 // ---- buttons ----
 
 void frmLabour::cmdDelete_Click() {
+  if (meMode != eEdit || !mrsDeletedItems || FGSelectedLabour.Row() < 1) return;
+  mHistory.Deleted(DeleteCurrentLine());
+}
+
+editor::DeletedRow frmLabour::DeleteCurrentLine() {
   grid::FlexGrid& g = FGSelectedLabour;
-  if (meMode != eEdit || !mrsDeletedItems) return;
   const int r = g.Row();
-  if (r < 1) return;
 
   // The row's stored records are deleted by the writer; every id is checked
   // before any is recorded, so a bad id records none of them.
@@ -357,7 +368,9 @@ void frmLabour::cmdDelete_Click() {
   for (const std::string& id : ids)
     editor::AddRemovedItem(*mrsDeletedItems, id);
 
-  if (r <= 1 && g.Rows() < 3) {
+  const bool onlyLine = r <= 1 && g.Rows() < 3;
+  editor::DeletedRow deleted = editor::SnapshotRow(g, r, ids, onlyLine);
+  if (onlyLine) {
     // The only item: its row stays as the empty placeholder.
     for (int c = 0; c < g.Cols(); ++c)
       g.TextMatrix(1, c, "");
@@ -370,6 +383,28 @@ void frmLabour::cmdDelete_Click() {
   // Escape restores, its tool tip and highlight, as on entering it.
   FGSelectedLabour_EnterCell();
   if (FGSelectedLabour.CanTakeFocus()) FGSelectedLabour.SetFocus();
+  return deleted;
+}
+
+void frmLabour::UndoDeletion() {
+  if (!mHistory.CanUndo() || !mrsDeletedItems) return;
+  grid::FlexGrid& g = FGSelectedLabour;
+  T1.Visible(false);
+  const editor::DeletedRow line = mHistory.Undo();
+  editor::RestoreRow(g, line);
+  if (!line.blanked && g.Rows() == 12)
+    g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - editor::kRowStepTwips);
+  editor::ForgetRemovedItems(*mrsDeletedItems, line.ids);
+  g.SetCurrentCell(line.row, col::kItemNo);
+  FGSelectedLabour_EnterCell();
+}
+
+void frmLabour::RedoDeletion() {
+  if (!mHistory.CanRedo() || !mrsDeletedItems) return;
+  T1.Visible(false);
+  const editor::DeletedRow line = mHistory.Redo();
+  FGSelectedLabour.SetCurrentCell(line.row, col::kItemNo);
+  mHistory.Redone(DeleteCurrentLine());
 }
 
 void frmLabour::HideEditorOnFocus() {

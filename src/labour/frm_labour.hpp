@@ -11,6 +11,7 @@
 //   editing.cpp    the selected grid's in-cell editor, keys, flags, delete
 
 #include "data/recordset.hpp"
+#include "editor/deletion_history.hpp"
 #include "editor/flag_glyphs.hpp"
 #include "forms/controls.hpp"
 #include "forms/form.hpp"
@@ -160,6 +161,10 @@ private:
   void T1_KeyDown(int& keyCode, int shift);
   void T1_KeyPress(int& keyAscii);
   void cmdDelete_Click();
+  // Deletes the current line; returns it as it stood, for taking it back.
+  editor::DeletedRow DeleteCurrentLine();
+  void UndoDeletion();      // Ctrl+Z
+  void RedoDeletion();      // Ctrl+Y
   void HideEditorOnFocus(); // cmdClose, cmdDelete, cmdHelp GotFocus
 
   // ---- shared helpers ----
@@ -179,6 +184,7 @@ private:
   EQuoteEditMode meMode = eView;
   std::unique_ptr<data::Recordset> mrsDeletedItems;
   std::vector<std::string> mvLoadedLines; // the selected grid as loaded
+  editor::DeletionHistory mHistory;       // this session's deletions
 };
 
 // The thread's labour editor, created on first use and kept.

@@ -221,6 +221,7 @@ void frmLabour::Form_Load() {
   try {
     mrsDeletedItems.reset(); // a list of this session's only, in edit mode only
     mvLoadedLines.clear();
+    mHistory.Clear();
     cipher::InitFieldCipher();
     forms::Screen.MousePointer(forms::kPointerHourglass);
     host::gbLabourFormLoaded = true;
