@@ -94,6 +94,11 @@ public:
   // Brings the window in front of the component's other windows.
   void ZOrder(int position = 0);
 
+  // A line of running totals that a desktop shows under the window while
+  // the estimator works (empty: the form has none). Worked out from the
+  // form's grids, so a view asks again whenever a grid changes.
+  virtual std::string RunningTotals() const { return {}; }
+
   // The control with the focus inside this form (nullptr for none).
   Control* ActiveControl() const noexcept { return active_; }
   // Every control, in declaration order.

@@ -53,6 +53,16 @@ using editor::kUnticked;
 inline constexpr const char* kDefaultRate = "<Default>";
 inline constexpr const char* kNoRate = "<NA>";
 
+// The money of the selected lines while they are edited: hours and amounts
+// per operation, R&R at each line's own rate and repair and paint at the
+// session's rates. Report-only operations are not charged.
+struct LabourTotals {
+  double hours[3] = {0, 0, 0}; // R&R, repair, paint
+  double amounts[3] = {0, 0, 0};
+  double Hours() const { return hours[0] + hours[1] + hours[2]; }
+  double Amount() const { return amounts[0] + amounts[1] + amounts[2]; }
+};
+
 class frmLabour : public forms::Form {
 public:
   // ---- controls ----
@@ -90,6 +100,11 @@ public:
   void SaveChanges();
   // Edit mode: reloads the selected grid from the record set.
   void UpdateChanges();
+
+  // The selected lines' totals as the grid stands now, and as the line
+  // the desktop shows under the window.
+  LabourTotals Totals() const;
+  std::string RunningTotals() const override;
 
   // Read-only views of the session, for hosts' tests and the desktop views.
   EQuoteEditMode Mode() const noexcept { return meMode; }

@@ -60,6 +60,38 @@ std::string Describe(const grid::FlexGrid& g, int row) {
 
 } // namespace
 
+LabourTotals frmLabour::Totals() const {
+  LabourTotals totals;
+  const grid::FlexGrid& g = FGSelectedLabour;
+  for (int r = 1; r < g.Rows(); ++r) {
+    if (text::Trim(g.TextView(r, col::kDescription)).empty()) continue;
+    for (size_t i = 0; i < kOperations.size(); ++i) {
+      const Operation& op = kOperations[i];
+      const auto hours = text::ParseNumber(g.TextView(r, op.hoursCol));
+      if (!hours) continue;
+      double rate = i == 1 ? mdRARate : mdPTRate;
+      if (i == 0) {
+        const auto own = text::ParseNumber(g.TextView(r, col::kRate));
+        rate = own ? *own : mdRRRate; // "<Default>", or no rate typed yet
+      }
+      totals.hours[i] += *hours;
+      if (g.TextView(r, op.reportCol) != kTicked) totals.amounts[i] += *hours * rate;
+    }
+  }
+  return totals;
+}
+
+std::string frmLabour::RunningTotals() const {
+  if (!Loaded()) return {};
+  const LabourTotals t = Totals();
+  auto money = [](double v) { return text::FormatNumber(v, text::kHours); };
+  const char* names[] = {"R&R", "Repair", "Paint"};
+  std::string line;
+  for (int i = 0; i < 3; ++i)
+    line += std::string(names[i]) + " " + money(t.hours[i]) + " h  " + money(t.amounts[i]) + "    ";
+  return line + "Labour " + money(t.Hours()) + " h  " + money(t.Amount());
+}
+
 void frmLabour::SaveChanges() {
   if (meMode == eEdit) WriteSelectedItems();
 }

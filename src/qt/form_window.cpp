@@ -32,6 +32,32 @@ namespace {
 constexpr int kExposeWaitMs = 1000;
 } // namespace
 
+// Watches the form's grids for any change of their cells or rows.
+class FormWindow::TotalsWatcher : public grid::ModelObserver {
+public:
+  explicit TotalsWatcher(FormWindow& window) : window_(window) {}
+  ~TotalsWatcher() override {
+    for (grid::Observable* grid : grids_)
+      grid->RemoveObserver(this);
+  }
+  void Watch(grid::Observable& grid) {
+    grids_.push_back(&grid);
+    grid.AddObserver(this);
+  }
+  void CellsChanged(int, int, int, int) override { Changed(); }
+  void LayoutChanged() override { Changed(); }
+  void ModelDestroyed() override { grids_.clear(); }
+
+private:
+  void Changed() {
+    if (window_.totalsPending_) return;
+    window_.totalsPending_ = true;
+    QTimer::singleShot(0, &window_, [w = &window_] { w->RefreshTotals(); });
+  }
+  FormWindow& window_;
+  std::vector<grid::Observable*> grids_;
+};
+
 FormWindow::FormWindow(QtRuntime& runtime, forms::Form& form, const Scale& scale)
     : QDialog(nullptr, Qt::Dialog | Qt::WindowTitleHint | Qt::WindowSystemMenuHint |
                            Qt::WindowCloseButtonHint | Qt::MSWindowsFixedSizeDialogHint),
@@ -45,15 +71,38 @@ FormWindow::FormWindow(QtRuntime& runtime, forms::Form& form, const Scale& scale
     MakeView(*control);
   for (auto& [control, view] : views_)
     view->SyncAll();
+  {
+    // A form with running totals shows them in a strip under its design
+    // area; the strip is hidden while the form has none.
+    totals_ = new QLabel(this);
+    totals_->setObjectName("RunningTotals");
+    totals_->setFrameShape(QFrame::StyledPanel);
+    totals_->setContentsMargins(6, 0, 6, 0);
+    totalsWatcher_ = std::make_unique<TotalsWatcher>(*this);
+    for (forms::Control* control : form.Controls())
+      if (auto* grid = dynamic_cast<forms::FlexGrid*>(control))
+        totalsWatcher_->Watch(static_cast<grid::FlexGrid&>(*grid));
+  }
   ApplyGeometry();
   ApplyFont();
   setWindowTitle(ToQString(form.Caption()));
   Restack();
   FollowFocus();
+  RefreshTotals();
   form.AddObserver(this);
 }
 
+void FormWindow::RefreshTotals() {
+  totalsPending_ = false;
+  if (!totals_ || !form_) return;
+  const std::string line = form_->RunningTotals();
+  totals_->setVisible(!line.empty());
+  totals_->setText(ToQString(line));
+  ApplyGeometry();
+}
+
 FormWindow::~FormWindow() {
+  totalsWatcher_.reset();
   if (form_) form_->RemoveObserver(this);
   if (loop_) loop_->quit();
 }
@@ -86,7 +135,11 @@ QWidget* FormWindow::ContainerWidget(const forms::Control& control) const {
 
 void FormWindow::ApplyGeometry() {
   if (!form_) return;
-  setFixedSize(scale_.Pixels(form_->ScaleWidth()), scale_.Pixels(form_->ScaleHeight()));
+  const int width = scale_.Pixels(form_->ScaleWidth());
+  const int height = scale_.Pixels(form_->ScaleHeight());
+  const int strip = totals_ && totals_->isVisibleTo(this) ? totals_->sizeHint().height() + 4 : 0;
+  if (totals_) totals_->setGeometry(0, height, width, strip);
+  setFixedSize(width, height + strip);
   if (placed_ && (form_->Left() != 0 || form_->Top() != 0))
     move(scale_.Pixels(form_->Left()), scale_.Pixels(form_->Top()));
 }

@@ -10,9 +10,11 @@
 #include "qt/scale.hpp"
 
 #include <QDialog>
+#include <QLabel>
 
 #include <functional>
 #include <map>
+#include <memory>
 
 class QEventLoop;
 class QKeyEvent;
@@ -77,6 +79,15 @@ private:
   bool Clipboard(QKeyEvent* event);
   void TypeText(const QString& text);
   void FormHidden();
+
+  // The running totals under the window, for forms that have them: asked
+  // again (once per turn of the event loop) whenever one of its grids
+  // changes.
+  class TotalsWatcher;
+  void RefreshTotals();
+  QLabel* totals_ = nullptr;
+  std::unique_ptr<TotalsWatcher> totalsWatcher_;
+  bool totalsPending_ = false;
 
   QtRuntime& runtime_;
   forms::Form* form_;

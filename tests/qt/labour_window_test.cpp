@@ -256,3 +256,23 @@ TEST_F(LabourWindowTest, TheWindowsCloseButtonAsksBeforeItDiscardsEdits) {
   EXPECT_FALSE(host::gbLabourFormLoaded);
   EXPECT_EQ(Records(), (std::vector<std::string>{"120 R&R 4"}));
 }
+
+TEST_F(LabourWindowTest, TheTotalsStripFollowsTypedHours) {
+  AddRecord(1, "120", "L/H FRONT GUARD", "R&R", 1.0);
+  Stored();
+  OpenWindow(eEdit, [&](labour::frmLabour& form) {
+    auto* strip = Qt().Window(form)->findChild<QLabel*>("RunningTotals");
+    ASSERT_NE(strip, nullptr);
+    EXPECT_TRUE(strip->isVisible());
+    EXPECT_TRUE(strip->text().startsWith("R&R 1.00 h  55.00")) << strip->text().toStdString();
+    ClickCell(form.FGSelectedLabour, 1, col::kRRHours);
+    Type("4");
+    QApplication::processEvents();
+    EXPECT_TRUE(strip->text().startsWith("R&R 4.00 h  220.00")) << strip->text().toStdString();
+    // The strip lies under the design area, which keeps its size.
+    EXPECT_EQ(strip->y(),
+              Grid(form.FGSelectedLabour)->Widget()->window()->height() - strip->height());
+    Key(Qt::Key_Return);
+    Click(form.cmdClose);
+  });
+}
