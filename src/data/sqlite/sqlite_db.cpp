@@ -109,7 +109,9 @@ Database::Database(std::string path, Mode mode, std::string label, std::string s
   }
 }
 
-Database::~Database() { sqlite3_close(db_); }
+// A statement that outlives its connection keeps the connection until it
+// is finalized, rather than leaving it open for good.
+Database::~Database() { sqlite3_close_v2(db_); }
 
 void Database::Fail(int rc, std::string_view context) const {
   if (rc == SQLITE_READONLY_ROLLBACK || rc == SQLITE_READONLY_RECOVERY)

@@ -22,6 +22,7 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <memory>
 #include <optional>
 #include <sstream>
 #include <system_error>
@@ -486,7 +487,10 @@ ImportResult ImportCsv(const ImportOptions& o) {
   for (size_t k = 0; k < target.size(); ++k)
     sql += (k ? ", ?" : "?") + std::to_string(k + 1);
   sql += ")";
-  sqlite::Statement insert(db, sql);
+  // The statement ends before the copy is closed and put in place: a
+  // connection with a statement still open cannot be closed.
+  auto insertHolder = std::make_unique<sqlite::Statement>(db, sql);
+  sqlite::Statement& insert = *insertHolder;
 
   for (size_t r = 1; r < records.size(); ++r) {
     const CsvRecord& rec = records[r];
@@ -566,6 +570,7 @@ ImportResult ImportCsv(const ImportOptions& o) {
     insert.Reset();
     ++result.rows;
   }
+  insertHolder.reset();
 
   // Record the columns --encipher added, so that readers and `check` know
   // them. A catalogue without the list gets one, holding the standard
