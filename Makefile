@@ -36,10 +36,10 @@ bench: build
 	@for b in $(BUILD)/bench/*/bench_*; do test -x $$b && $$b; done
 
 format:
-	find src apps tests bench examples -name '*.cpp' -o -name '*.hpp' 2>/dev/null | xargs clang-format -i
+	find src apps tests bench examples fuzz -name '*.cpp' -o -name '*.hpp' 2>/dev/null | xargs clang-format -i
 
 format-check:
-	find src apps tests bench examples -name '*.cpp' -o -name '*.hpp' 2>/dev/null | xargs clang-format --dry-run --Werror
+	find src apps tests bench examples fuzz -name '*.cpp' -o -name '*.hpp' 2>/dev/null | xargs clang-format --dry-run --Werror
 
 clean:
 	rm -rf $(BUILD) $(BUILD_ASAN)

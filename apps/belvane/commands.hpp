@@ -17,4 +17,11 @@ void RegisterField(CLI::App& app, int& exitCode);
 void RegisterCatalogue(CLI::App& app, int& exitCode);
 void RegisterSettings(CLI::App& app, int& exitCode);
 
+// Flushes standard output. When anything written to it was lost (a full
+// disk, /dev/full, a file that cannot grow), reports so on standard error
+// as "<command>: cannot write the output: <reason>" and returns 2; else
+// returns `exitCode`. Every command that writes results ends with it, so
+// that lost output is never reported as success.
+int FinishOutput(const char* command, int exitCode);
+
 } // namespace belvane::cli

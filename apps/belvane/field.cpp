@@ -54,12 +54,13 @@ bool ProcessOne(bool encrypt, const std::string& value, const char* what, std::s
   return false;
 }
 
-int RunField(bool encrypt, const FieldOptions& opt) {
-  // Key problems are errors of the whole command, reported by main.
-  if (opt.keyFile.empty()) {
-    cipher::InitFieldCipher();
-  } else {
+int RunField(bool encrypt, const FieldOptions& opt, bool keyFileNamed) {
+  // Key problems are errors of the whole command, reported by main. A key
+  // file that was named is used or fails, even when the name is empty.
+  if (keyFileNamed) {
     cipher::SetFieldKeyFile(opt.keyFile);
+  } else {
+    cipher::InitFieldCipher();
   }
   bool allDone = true;
   std::size_t number = 0;
@@ -84,8 +85,9 @@ void AddFieldCommand(CLI::App& group, bool encrypt, int& exitCode) {
       encrypt ? "encrypt" : "decrypt",
       encrypt ? "Encipher values (UTF-8) into enciphered field texts (uppercase hexadecimal)"
               : "Decipher enciphered field texts into their values (UTF-8)");
-  cmd->add_option("--key-file", opt->keyFile, "File holding the key text (see below)")
-      ->type_name("FILE");
+  auto* keyFile =
+      cmd->add_option("--key-file", opt->keyFile, "File holding the key text (see below)")
+          ->type_name("FILE");
   cmd->add_option(encrypt ? "VALUE" : "TEXT", opt->values,
                   encrypt ? "Values to encipher; none: read one value per line from standard "
                             "input (use -- before values that begin with -)"
@@ -93,7 +95,10 @@ void AddFieldCommand(CLI::App& group, bool encrypt, int& exitCode) {
                             "standard input")
       ->type_name("");
   cmd->footer(KeyHelp());
-  cmd->callback([opt, encrypt, &exitCode] { exitCode = RunField(encrypt, *opt); });
+  cmd->callback([opt, encrypt, keyFile, &exitCode] {
+    exitCode = FinishOutput(encrypt ? "belvane field encrypt" : "belvane field decrypt",
+                            RunField(encrypt, *opt, keyFile->count() > 0));
+  });
 }
 
 } // namespace

@@ -72,17 +72,21 @@ std::string BuiltInCipherKeyText() {
       std::string_view(reinterpret_cast<const char*>(kBuiltInKey.data()), kBuiltInKey.size()));
 }
 
-std::string BuildCipherKeyText() {
+std::string BuildCipherKeyText() { return BuildCipherKeyText(kFieldKeyFilePath); }
+
+std::string BuildCipherKeyText(const std::filesystem::path& machineKeyFile) {
   if (auto host = HostKeyText()) return *host;
+  // The link itself counts: a key file that is a link to nowhere is a key
+  // file that cannot be read, not an absent one.
   std::error_code ec;
-  const auto status = std::filesystem::status(kFieldKeyFilePath, ec);
+  const auto status = std::filesystem::symlink_status(machineKeyFile, ec);
   if (ec && ec != std::errc::no_such_file_or_directory) {
     throw Error(kFileAccess,
-                std::string("Path/File access error: cannot look up the key file ") +
-                    kFieldKeyFilePath + ": " + ec.message(),
+                "Path/File access error: cannot look up the key file " + machineKeyFile.string() +
+                    ": " + ec.message(),
                 kSource);
   }
-  if (std::filesystem::exists(status)) return ReadFieldKeyFile(kFieldKeyFilePath);
+  if (std::filesystem::exists(status)) return ReadFieldKeyFile(machineKeyFile);
   return BuiltInCipherKeyText();
 }
 
@@ -110,9 +114,18 @@ std::string NormaliseFieldKeyText(std::string_view keyText) {
 }
 
 std::string ReadFieldKeyFile(const std::filesystem::path& path) {
+  if (path.empty())
+    throw Error(err::kInvalidCall, "Invalid key file: the key file name is empty", kSource);
   std::error_code ec;
   const auto status = std::filesystem::status(path, ec);
   if (ec == std::errc::no_such_file_or_directory) {
+    std::error_code linkEc;
+    if (std::filesystem::is_symlink(std::filesystem::symlink_status(path, linkEc)))
+      throw Error(kFileNotFound,
+                  "File not found: key file " + path.string() + " is a link to " +
+                      std::filesystem::read_symlink(path, linkEc).string() +
+                      ", which does not exist",
+                  kSource);
     throw Error(kFileNotFound, "File not found: key file " + path.string(), kSource);
   }
   std::ifstream in;

@@ -27,8 +27,12 @@ inline constexpr const char* kFieldKeyFilePath = "/etc/belvane/field-cipher.key"
 std::string BuiltInCipherKeyText();
 
 // The key text of the key in force (see above). Raises the errors of
-// ReadFieldKeyFile when the machine-wide key file exists but is unusable.
+// ReadFieldKeyFile when anything is at the machine-wide key file's path
+// (a file, a folder, a link, even one that leads nowhere) but no key can be
+// read from it: only a path where nothing is gives the built-in key.
 std::string BuildCipherKeyText();
+// As above, with the machine-wide key file at `machineKeyFile`.
+std::string BuildCipherKeyText(const std::filesystem::path& machineKeyFile);
 
 // A key text with its whitespace removed and its digits in upper case.
 // Raises error 13 for a character that is neither whitespace nor a
@@ -37,8 +41,9 @@ std::string BuildCipherKeyText();
 std::string NormaliseFieldKeyText(std::string_view keyText);
 
 // The normalised key text held in a key file. Raises error 53 when the file
-// does not exist, 75 when it cannot be read, and the errors of
-// NormaliseFieldKeyText, each naming the file.
+// does not exist (a link that leads nowhere included), 75 when it cannot be
+// read, 5 for an empty file name, and the errors of NormaliseFieldKeyText,
+// each naming the file. A key file that was named is never passed over.
 std::string ReadFieldKeyFile(const std::filesystem::path& path);
 
 // Sets the host's key for the whole process and sets it up on the calling

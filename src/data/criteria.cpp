@@ -4,15 +4,27 @@
 #include "text/number.hpp"
 #include "text/strings.hpp"
 
+#include <algorithm>
 #include <cctype>
+#include <cmath>
+#include <cstdint>
 
 namespace belvane::data {
 
 namespace {
 
+// How much of a criteria text an error quotes: enough to recognise it.
+constexpr size_t kQuotedCriteriaChars = 200;
+
 [[noreturn]] void Malformed(std::string_view criteria, std::string_view why) {
-  throw Error(err::kBadArguments,
-              "Malformed criteria \"" + std::string(criteria) + "\": " + std::string(why),
+  size_t cut = std::min(criteria.size(), kQuotedCriteriaChars);
+  while (cut > 0 && cut < criteria.size() &&
+         (static_cast<unsigned char>(criteria[cut]) & 0xC0) == 0x80)
+    --cut; // whole characters only
+  std::string quoted(criteria.substr(0, cut));
+  if (criteria.size() > kQuotedCriteriaChars)
+    quoted += "... (" + std::to_string(criteria.size()) + " characters)";
+  throw Error(err::kBadArguments, "Malformed criteria \"" + quoted + "\": " + std::string(why),
               "Belvane.Recordset");
 }
 
@@ -20,42 +32,48 @@ class Parser {
 public:
   explicit Parser(std::string_view s) : s_(s) {}
 
-  std::unique_ptr<CriteriaNode> ParseOr() {
-    auto left = ParseAnd();
-    while (Keyword("OR")) {
-      auto node = std::make_unique<CriteriaNode>();
-      node->kind = CriteriaNode::Kind::Or;
-      node->left = std::move(left);
-      node->right = ParseAnd();
-      left = std::move(node);
-    }
-    return left;
+  // A run of comparisons joined by OR (or by AND) becomes one node whose
+  // children are the operands, so a long run costs no depth.
+  CriteriaNode ParseOr() {
+    CriteriaNode first = ParseAnd();
+    if (!Keyword("OR")) return first;
+    CriteriaNode node;
+    node.kind = CriteriaNode::Kind::Or;
+    node.children.push_back(std::move(first));
+    do {
+      node.children.push_back(ParseAnd());
+    } while (Keyword("OR"));
+    return node;
   }
 
-  std::unique_ptr<CriteriaNode> ParseAnd() {
-    auto left = ParsePrimary();
-    while (Keyword("AND")) {
-      auto node = std::make_unique<CriteriaNode>();
-      node->kind = CriteriaNode::Kind::And;
-      node->left = std::move(left);
-      node->right = ParsePrimary();
-      left = std::move(node);
-    }
-    return left;
+  CriteriaNode ParseAnd() {
+    CriteriaNode first = ParsePrimary();
+    if (!Keyword("AND")) return first;
+    CriteriaNode node;
+    node.kind = CriteriaNode::Kind::And;
+    node.children.push_back(std::move(first));
+    do {
+      node.children.push_back(ParsePrimary());
+    } while (Keyword("AND"));
+    return node;
   }
 
-  std::unique_ptr<CriteriaNode> ParsePrimary() {
+  CriteriaNode ParsePrimary() {
     SkipBlanks();
     if (Peek() == '(') {
+      if (++depth_ > kMaxCriteriaNesting)
+        Malformed(s_,
+                  "parentheses nest more than " + std::to_string(kMaxCriteriaNesting) + " deep");
       ++pos_;
-      auto inner = ParseOr();
+      CriteriaNode inner = ParseOr();
       SkipBlanks();
       if (Peek() != ')') Malformed(s_, "missing ')'");
       ++pos_;
+      --depth_;
       return inner;
     }
-    auto node = std::make_unique<CriteriaNode>();
-    node->cmp = ParseComparisonHere();
+    CriteriaNode node;
+    node.cmp = ParseComparisonHere();
     return node;
   }
 
@@ -174,33 +192,47 @@ private:
     text::ScopedNumberLocale c({".", ","});
     auto n = text::ParseNumber(num);
     if (!n) Malformed(s_, "\"" + num + "\" is not a number");
-    if (*n == static_cast<double>(static_cast<int32_t>(*n)) && num.find('.') == std::string::npos)
-      return Value(static_cast<int32_t>(*n));
-    return Value(*n);
+    // A whole number within 32 bits is an Integer; any other number (a
+    // fraction, or too large for 32 bits) is a Double.
+    const double d = *n;
+    if (num.find('.') == std::string::npos && d >= INT32_MIN && d <= INT32_MAX &&
+        d == std::trunc(d))
+      return Value(static_cast<int32_t>(d));
+    return Value(d);
   }
 
   std::string_view s_;
   size_t pos_ = 0;
+  int depth_ = 0;
 };
 
-bool LikeAt(std::string_view t, size_t ti, std::string_view p, size_t pi) {
-  while (pi < p.size()) {
-    char pc = p[pi];
-    if (pc == '*' || pc == '%') {
-      while (pi < p.size() && (p[pi] == '*' || p[pi] == '%'))
-        ++pi;
-      if (pi == p.size()) return true;
-      for (size_t k = ti; k <= t.size(); ++k) {
-        if (LikeAt(t, k, p, pi)) return true;
-      }
+bool IsAnyRun(char c) { return c == '*' || c == '%'; }
+bool IsAnyOne(char c) { return c == '_' || c == '?'; }
+
+// Wildcard matching without recursion: on a mismatch only the most recent
+// run wildcard is widened by one character, which is enough because a later
+// run can absorb whatever an earlier one would have. At worst the value is
+// scanned once per pattern character.
+bool LikeAt(std::string_view t, std::string_view p) {
+  size_t ti = 0, pi = 0;
+  size_t runP = std::string_view::npos, runT = 0;
+  while (ti < t.size()) {
+    if (pi < p.size() && IsAnyRun(p[pi])) {
+      runP = ++pi;
+      runT = ti;
+    } else if (pi < p.size() && (IsAnyOne(p[pi]) || p[pi] == t[ti])) {
+      ++ti;
+      ++pi;
+    } else if (runP != std::string_view::npos) {
+      pi = runP;
+      ti = ++runT;
+    } else {
       return false;
     }
-    if (ti >= t.size()) return false;
-    if (pc != '_' && pc != '?' && pc != t[ti]) return false;
-    ++ti;
-    ++pi;
   }
-  return ti == t.size();
+  while (pi < p.size() && IsAnyRun(p[pi]))
+    ++pi;
+  return pi == p.size();
 }
 
 } // namespace
@@ -212,16 +244,16 @@ Comparison ParseComparison(std::string_view criteria) {
   return c;
 }
 
-std::unique_ptr<CriteriaNode> ParseCriteria(std::string_view criteria) {
+CriteriaNode ParseCriteria(std::string_view criteria) {
   Parser p(criteria);
-  auto node = p.ParseOr();
+  CriteriaNode node = p.ParseOr();
   if (!p.AtEnd()) Malformed(criteria, "unexpected text");
   return node;
 }
 
 bool LikeMatch(std::string_view textValue, std::string_view pattern) {
   std::string t = text::UCase(textValue), p = text::UCase(pattern);
-  return LikeAt(t, 0, p, 0);
+  return LikeAt(t, p);
 }
 
 bool Matches(const Comparison& cmp, const Value& fieldValue) {

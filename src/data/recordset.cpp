@@ -5,7 +5,10 @@
 #include "text/strings.hpp"
 
 #include <algorithm>
+#include <climits>
+#include <cmath>
 #include <numeric>
+#include <optional>
 
 namespace belvane::data {
 
@@ -24,25 +27,19 @@ std::string FoldName(std::string_view name) { return text::UCase(name); }
 
 bool IsIntegerType(DataType t) { return t == DataType::Integer || t == DataType::SmallInt; }
 
-// Evaluates a parsed filter on one record.
+// Evaluates a parsed filter on one record. `leaf` numbers the comparisons
+// in text order; every one is visited so the numbering stays in step. The
+// recursion is as deep as the parentheses nest, which the parser bounds.
 bool Evaluate(const CriteriaNode& node, const std::vector<Value>& values,
               const std::vector<size_t>& fieldOf, size_t& leaf) {
-  switch (node.kind) {
-  case CriteriaNode::Kind::Compare:
-    return Matches(node.cmp, values[fieldOf[leaf++]]);
-  case CriteriaNode::Kind::And: {
-    // Both sides are evaluated so leaf numbering stays in step.
-    bool l = Evaluate(*node.left, values, fieldOf, leaf);
-    bool r = Evaluate(*node.right, values, fieldOf, leaf);
-    return l && r;
+  if (node.kind == CriteriaNode::Kind::Compare) return Matches(node.cmp, values[fieldOf[leaf++]]);
+  const bool isAnd = node.kind == CriteriaNode::Kind::And;
+  bool result = isAnd;
+  for (const CriteriaNode& child : node.children) {
+    const bool r = Evaluate(child, values, fieldOf, leaf);
+    result = isAnd ? result && r : result || r;
   }
-  case CriteriaNode::Kind::Or: {
-    bool l = Evaluate(*node.left, values, fieldOf, leaf);
-    bool r = Evaluate(*node.right, values, fieldOf, leaf);
-    return l || r;
-  }
-  }
-  return false;
+  return result;
 }
 
 void CollectLeaves(const CriteriaNode& node, std::vector<const Comparison*>& out) {
@@ -50,8 +47,22 @@ void CollectLeaves(const CriteriaNode& node, std::vector<const Comparison*>& out
     out.push_back(&node.cmp);
     return;
   }
-  CollectLeaves(*node.left, out);
-  CollectLeaves(*node.right, out);
+  for (const CriteriaNode& child : node.children)
+    CollectLeaves(child, out);
+}
+
+// `from` moved `skip` records in the search direction, held within
+// [-1, n] so that a huge skip count lands past the end instead of
+// overflowing.
+long SkipFrom(long from, long skip, SearchDirection direction, long n) {
+  long moved = 0;
+  const bool overflow = direction == adSearchForward ? __builtin_add_overflow(from, skip, &moved)
+                                                     : __builtin_sub_overflow(from, skip, &moved);
+  if (overflow) {
+    const bool up = (direction == adSearchForward) == (skip > 0);
+    return up ? n : -1;
+  }
+  return std::clamp(moved, -1L, n);
 }
 
 struct SortKey {
@@ -320,11 +331,13 @@ void Recordset::Find(std::string_view criteria, long skipRecords, SearchDirectio
     from = pos_;
     break;
   }
-  from += direction == adSearchForward ? skipRecords : -skipRecords;
+  from = SkipFrom(from, skipRecords, direction, n);
 
   if (cmp.op == CompareOp::Eq && IsIntegerType(fields_.defs_[field].type) && cmp.value.IsNumber()) {
-    double key = cmp.value.ToDouble();
-    if (key == static_cast<double>(static_cast<int32_t>(key))) {
+    const double key = cmp.value.ToDouble();
+    // A key beyond 32 bits or with a fraction matches no integer: the scan
+    // below finds nothing, as it should.
+    if (key >= INT32_MIN && key <= INT32_MAX && key == std::trunc(key)) {
       if (!FindWithIndex(field, static_cast<int32_t>(key), from, direction))
         pos_ = direction == adSearchForward ? n : -1;
       return;
@@ -416,9 +429,9 @@ void Recordset::SetSort(std::string_view sortText) {
 void Recordset::SetFilter(std::string_view criteria) {
   RequireOpen();
   if (!text::Trim(criteria).empty() && text::Trim(criteria) != "0") {
-    auto tree = ParseCriteria(criteria);
+    const CriteriaNode tree = ParseCriteria(criteria);
     std::vector<const Comparison*> leaves;
-    CollectLeaves(*tree, leaves);
+    CollectLeaves(tree, leaves);
     for (auto* c : leaves)
       RequireField(c->field);
     filter_ = std::string(criteria);
@@ -430,7 +443,7 @@ void Recordset::SetFilter(std::string_view criteria) {
 
 void Recordset::RebuildView() {
   view_.clear();
-  std::unique_ptr<CriteriaNode> tree;
+  std::optional<CriteriaNode> tree;
   std::vector<size_t> fieldOf;
   if (!filter_.empty()) {
     tree = ParseCriteria(filter_);

@@ -126,8 +126,10 @@ public:
   // --- Searching and ordering ---------------------------------------------
   // Moves to the first record from `start` (after skipping `skipRecords`)
   // that meets "FIELD op value"; when none does the cursor ends at EOF
-  // (forward) or BOF (backward). Equality on an integer field is answered
-  // from an index.
+  // (forward) or BOF (backward). A skip count moves the start in the search
+  // direction (a negative one against it), held to just before the first or
+  // just after the last record however large it is. Equality on an integer
+  // field is answered from an index.
   void Find(std::string_view criteria, long skipRecords = 0,
             SearchDirection direction = adSearchForward, BookmarkEnum start = adBookmarkCurrent);
   // "field [ASC|DESC], ..." ; "" restores load order. Stable, Nulls first

@@ -110,6 +110,13 @@ template <typename F> std::string MapChars(std::string_view s, F f) {
 
 } // namespace
 
+bool IsValidUtf8(std::string_view text) {
+  size_t i = 0;
+  while (i < text.size())
+    if (!DecodeUtf8(text, i)) return false;
+  return true;
+}
+
 std::string EncodeUtf8(char32_t character) {
   std::string out;
   AppendUtf8(out, character);

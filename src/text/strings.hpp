@@ -23,6 +23,10 @@ std::string LCase(std::string_view utf8);
 // Case-insensitive equality under the rules of UCase.
 bool EqualsNoCase(std::string_view a, std::string_view b);
 
+// True when the text is well-formed UTF-8: no overlong forms, no
+// surrogates, nothing past U+10FFFF, no cut-off sequence.
+bool IsValidUtf8(std::string_view text);
+
 // The UTF-8 form of one character; surrogates and values past U+10FFFF
 // give U+FFFD.
 std::string EncodeUtf8(char32_t character);

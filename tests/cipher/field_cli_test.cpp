@@ -107,3 +107,28 @@ TEST_F(FieldCli, KeyFileProblemsStopTheCommand) {
 }
 
 } // namespace
+
+TEST_F(FieldCli, AnEmptyOrDanglingKeyFileIsAnErrorNotTheBuiltInKey) {
+  const CliResult empty = Belvane("field encrypt --key-file '' 12.50");
+  EXPECT_EQ(empty.status, 2);
+  EXPECT_EQ(empty.out, "");
+  EXPECT_NE(empty.err.find("key file name is empty"), std::string::npos) << empty.err;
+
+  fs::create_symlink(dir_ / "nowhere.key", dir_ / "link.key");
+  const CliResult dangling = Belvane("field decrypt --key-file link.key C8FAD48D7DE50547");
+  EXPECT_EQ(dangling.status, 2);
+  EXPECT_NE(dangling.err.find("link.key is a link to"), std::string::npos) << dangling.err;
+}
+
+TEST_F(FieldCli, OutputThatCannotBeWrittenIsAFailure) {
+  for (const char* args :
+       {"field encrypt --key-file test.key 12.50", "field decrypt C8FAD48D7DE50547"}) {
+    const std::string cmd = "cd '" + dir_.string() + "' && '" BELVANE_CLI_PATH "' " + args +
+                            " </dev/null >/dev/full 2>err.txt";
+    const int raw = std::system(cmd.c_str());
+    ASSERT_TRUE(WIFEXITED(raw));
+    EXPECT_EQ(WEXITSTATUS(raw), 2) << args;
+    EXPECT_NE(Read(dir_ / "err.txt").find("cannot write the output"), std::string::npos)
+        << Read(dir_ / "err.txt");
+  }
+}

@@ -242,3 +242,30 @@ TEST_F(FieldTest, KeyTextsAndKeyFiles) {
   EXPECT_EQ(BuildCipherKeyText(), builtIn);
   EXPECT_EQ(EncryptField("12.50"), "C0A502F2F0B2EB47"); // catalogues rely on the built-in key
 }
+
+TEST_F(FieldTest, AKeyFileThatWasNamedIsNeverPassedOver) {
+  const auto dir =
+      std::filesystem::temp_directory_path() / ("belvane-keylink-" + std::to_string(getpid()));
+  std::filesystem::remove_all(dir);
+  std::filesystem::create_directories(dir);
+  ResetFieldKey();
+  // Nothing at the machine-wide path: the built-in key.
+  EXPECT_EQ(BuildCipherKeyText(dir / "absent.key"), BuiltInCipherKeyText());
+  // A link that leads nowhere is a key file that cannot be read.
+  std::filesystem::create_symlink(dir / "gone.key", dir / "machine.key");
+  auto [number, why] = Failure([&] { BuildCipherKeyText(dir / "machine.key"); });
+  EXPECT_EQ(number, 53);
+  EXPECT_NE(why.find("machine.key is a link to"), std::string::npos) << why;
+  EXPECT_EQ(ErrorNumber([&] { SetFieldKeyFile(dir / "machine.key"); }), 53);
+  // A folder in its place cannot be read either.
+  std::filesystem::create_directories(dir / "folder.key");
+  EXPECT_EQ(ErrorNumber([&] { BuildCipherKeyText(dir / "folder.key"); }), 75);
+  // An empty name is not "no key file".
+  std::tie(number, why) = Failure([&] { SetFieldKeyFile(""); });
+  EXPECT_EQ(number, err::kInvalidCall);
+  EXPECT_NE(why.find("name is empty"), std::string::npos);
+  // Once the link leads to a key, that key is used.
+  std::ofstream(dir / "gone.key") << kTestKey;
+  EXPECT_EQ(BuildCipherKeyText(dir / "machine.key"), kTestKey);
+  std::filesystem::remove_all(dir);
+}

@@ -168,7 +168,33 @@ SqliteCatalogue::~SqliteCatalogue() = default;
 const std::string& SqliteCatalogue::Path() const { return db_->Path(); }
 
 RecordsetPtr SqliteCatalogue::OpenRecordset(const std::string& sql, long, long) {
-  sqlite::Statement st(*db_, sql);
+  return sqlite::ReadRecordset(*PrepareQuery(sql));
+}
+
+long long
+SqliteCatalogue::StreamRows(const std::string& sql,
+                            const std::function<void(const std::vector<std::string>&)>& header,
+                            const std::function<bool(const std::vector<Value>&)>& row) {
+  auto st = PrepareQuery(sql);
+  const int columns = st->ColumnCount();
+  std::vector<std::string> names;
+  for (int c = 0; c < columns; ++c)
+    names.push_back(st->ColumnName(c));
+  header(names);
+  long long rows = 0;
+  std::vector<Value> values(static_cast<size_t>(columns));
+  while (st->Step()) {
+    for (int c = 0; c < columns; ++c)
+      values[static_cast<size_t>(c)] = st->Column(c);
+    ++rows;
+    if (!row(values)) break;
+  }
+  return rows;
+}
+
+std::unique_ptr<sqlite::Statement> SqliteCatalogue::PrepareQuery(const std::string& sql) {
+  auto holder = std::make_unique<sqlite::Statement>(*db_, sql);
+  sqlite::Statement& st = *holder;
   if (st.Empty()) db_->Fail(err::kBadCommand, "the SQL text holds no statement");
   {
     // Whatever follows the first statement must be blanks or comments.
@@ -181,7 +207,7 @@ RecordsetPtr SqliteCatalogue::OpenRecordset(const std::string& sql, long, long) 
   }
   if (!st.ReadOnly() || st.ColumnCount() == 0)
     db_->Fail(err::kBadCommand, "only a read-only query may run on the catalogue: " + sql);
-  return sqlite::ReadRecordset(st);
+  return holder;
 }
 
 void SqliteCatalogue::GetLabourItems(RecordsetPtr& rs, long schedule, const std::string& firstId,

@@ -5,8 +5,10 @@
 
 #include "data/catalogue.hpp"
 
+#include <functional>
 #include <memory>
 #include <string>
+#include <vector>
 
 namespace belvane::data {
 
@@ -42,7 +44,17 @@ public:
                        const std::string& bodyId, int16_t state) override;
   bool HasVehicleDiagram(const std::string& make) override;
 
+  // Runs one read-only query as OpenRecordset does, but hands the rows over
+  // one at a time as they are read instead of holding them all: first the
+  // column names to `header`, then each row's values to `row`, which
+  // returns false to stop. Returns the rows handed over.
+  long long StreamRows(const std::string& sql,
+                       const std::function<void(const std::vector<std::string>&)>& header,
+                       const std::function<bool(const std::vector<Value>&)>& row);
+
 private:
+  // The single read-only statement of `sql`, prepared.
+  std::unique_ptr<sqlite::Statement> PrepareQuery(const std::string& sql);
   std::unique_ptr<sqlite::Database> db_;
 };
 

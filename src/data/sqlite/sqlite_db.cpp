@@ -23,7 +23,6 @@ long NumberFor(int rc, std::string_view message) {
   case SQLITE_CORRUPT:
   case SQLITE_IOERR:
   case SQLITE_PERM:
-  case SQLITE_AUTH:
   case SQLITE_FULL:
   case SQLITE_NOMEM:
   case SQLITE_BUSY:
@@ -35,6 +34,33 @@ long NumberFor(int rc, std::string_view message) {
   }
   if (message.starts_with("no such table")) return err::kNoSuchTable;
   return err::kBadCommand;
+}
+
+// Functions no statement on these connections may call, whatever the text
+// or the file's schema says: fts3_tokenizer reads and writes a pointer to
+// native code (an address leak with one argument, a call to any address
+// with two), load_extension runs native code from a file.
+int RefuseUnsafeFunctions(void*, int action, const char*, const char* function, const char*,
+                          const char*) {
+  if (action != SQLITE_FUNCTION || !function) return SQLITE_OK;
+  for (const char* refused : {"fts3_tokenizer", "load_extension"})
+    if (sqlite3_stricmp(function, refused) == 0) return SQLITE_DENY;
+  return SQLITE_OK;
+}
+
+// Settings every connection gets before it reads anything of the file.
+void Harden(sqlite3* db) {
+  // Catalogue texts may not reach other files, and nothing may rewrite the
+  // schema behind SQLite's back.
+  sqlite3_limit(db, SQLITE_LIMIT_ATTACHED, 0);
+  sqlite3_db_config(db, SQLITE_DBCONFIG_DEFENSIVE, 1, nullptr);
+  // A database file comes from outside: its views and triggers may use only
+  // functions without side effects, and full-text tokenizers cannot be
+  // replaced.
+  sqlite3_db_config(db, SQLITE_DBCONFIG_TRUSTED_SCHEMA, 0, nullptr);
+  sqlite3_db_config(db, SQLITE_DBCONFIG_ENABLE_FTS3_TOKENIZER, 0, nullptr);
+  sqlite3_db_config(db, SQLITE_DBCONFIG_ENABLE_LOAD_EXTENSION, 0, nullptr);
+  sqlite3_set_authorizer(db, RefuseUnsafeFunctions, nullptr);
 }
 
 } // namespace
@@ -69,10 +95,7 @@ Database::Database(std::string path, Mode mode, std::string label, std::string s
   }
   sqlite3_extended_result_codes(db_, 1);
   sqlite3_busy_timeout(db_, kBusyTimeoutMs);
-  // Catalogue texts may not reach other files, and nothing may rewrite the
-  // schema behind SQLite's back.
-  sqlite3_limit(db_, SQLITE_LIMIT_ATTACHED, 0);
-  sqlite3_db_config(db_, SQLITE_DBCONFIG_DEFENSIVE, 1, nullptr);
+  Harden(db_);
   try {
     if (mode == Mode::ReadOnly) Exec("PRAGMA query_only = 1");
     // SQLite reads the file lazily: read the schema now, so that a file that
@@ -86,9 +109,16 @@ Database::Database(std::string path, Mode mode, std::string label, std::string s
   }
 }
 
-Database::~Database() { sqlite3_close(db_); }
+// A statement that outlives its connection keeps the connection until it
+// is finalized, rather than leaving it open for good.
+Database::~Database() { sqlite3_close_v2(db_); }
 
 void Database::Fail(int rc, std::string_view context) const {
+  if (rc == SQLITE_READONLY_ROLLBACK || rc == SQLITE_READONLY_RECOVERY)
+    Fail(err::kDataService,
+         "a change to this file was interrupted (its journal is still beside it), and the file "
+         "cannot be read until that change is rolled back. Run \"belvane catalogue recover --db " +
+             path_ + "\" (or open the file once for writing) to roll it back.");
   std::string message = db_ ? sqlite3_errmsg(db_) : sqlite3_errstr(rc);
   std::string what(context);
   if (!what.empty()) what += ": ";

@@ -16,6 +16,10 @@ namespace fs = std::filesystem;
 SqliteCatalogueWriter::SqliteCatalogueWriter(std::string path, std::vector<std::string> omitTables)
     : path_(std::move(path)), partial_(path_ + ".partial"), omit_(std::move(omitTables)) {
   std::error_code ec;
+  if (fs::is_directory(path_, ec))
+    throw Error(err::kDataService,
+                "Catalogue " + path_ + ": this is a folder, not a catalogue file; name a file",
+                sqlite::kSource);
   fs::remove(partial_, ec); // a leftover of an earlier run that stopped
   db_ = std::make_unique<sqlite::Database>(partial_, sqlite::Database::Mode::Create);
   // The file is not in place until Commit, so a crash loses nothing: no
@@ -67,9 +71,10 @@ void SqliteCatalogueWriter::Commit() {
   std::error_code ec;
   fs::rename(partial_, path_, ec);
   if (ec) {
+    const std::string why = ec.message();
     fs::remove(partial_, ec);
     throw Error(err::kDataService,
-                "Catalogue " + path_ + ": cannot put the new file in place: " + ec.message(),
+                "Catalogue " + path_ + ": cannot put the new file in place: " + why,
                 sqlite::kSource);
   }
 }

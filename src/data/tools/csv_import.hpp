@@ -10,10 +10,14 @@
 // written with '.' and shorter than 16 characters as a number, anything
 // else as text.
 //
-// The whole file goes in one transaction: the first malformed row (wrong
-// field count, bad number, a value the table refuses) stops the import with
-// its line in the file (the header is line 1) and the reason, and nothing of
-// the file is written.
+// The whole file goes in at once: the first malformed row (wrong field
+// count, bad number, a value the table refuses) stops the import with its
+// line in the file (the header is line 1) and the reason, and nothing of
+// the file is written. The import fills a copy of the catalogue beside it
+// (<database>.import-partial) and renames it over the catalogue when
+// complete, so an import that is killed or crashes leaves the catalogue as
+// it was; readers keep reading the old file meanwhile. Two imports into one
+// catalogue at once are refused.
 
 #include <string>
 #include <vector>
@@ -24,10 +28,17 @@ struct ImportOptions {
   std::string database; // created with the catalogue tables when missing
   std::string table;    // an existing table, named without regard to case
   std::string csvFile;
-  // Columns whose values are enciphered with the field cipher (the key in
-  // force on this thread) as they go in. Blank values (empty or only
-  // spaces) stay as they are, since readers take them as absent. The
-  // columns are recorded in the catalogue's list of enciphered columns.
+  // The values of the columns the catalogue lists as enciphered (its
+  // CIPHER_COLUMN table, else the standard list) are enciphered with the
+  // field cipher (the key in force on this thread) as they go in, for rule
+  // "always". A column of rule "long" (the hours) takes plain numbers of
+  // fewer than 16 characters as they are, and longer values as enciphered
+  // already, which must decipher to a number. Blank values (empty or only
+  // spaces) stay as they are, since readers take them as absent.
+  // `encipher` names more columns to encipher, every value; they are added
+  // to the catalogue's list. A column that is not listed yet but already
+  // holds values is refused, so that no column mixes plain and enciphered
+  // values.
   std::vector<std::string> encipher;
 };
 
@@ -52,7 +63,9 @@ struct CsvRecord {
   long line = 0; // line of the file the record starts on
   std::vector<CsvField> fields;
 };
-// Parses a whole CSV text. Lines that are entirely empty are skipped.
+// Parses a whole CSV text. Lines end with LF or CR LF; a CR at the very end
+// of the text ends the last line too. Lines that are entirely empty are
+// skipped.
 // Raises error 5 naming `fileName` and the line for an unterminated quote
 // or text after a closing quote.
 std::vector<CsvRecord> ParseCsv(std::string_view text, const std::string& fileName);
