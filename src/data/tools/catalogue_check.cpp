@@ -130,13 +130,13 @@ void CheckContents(sqlite::Database& db, CheckReport& report) {
                        [&](const std::string& n) { return text::EqualsNoCase(n, name); });
   };
 
-  for (const TableSpec& def : CatalogueTables()) {
+  for (const TableDef& def : CatalogueTables()) {
     if (!db.HasTable(def.name)) {
       report.missing.push_back("table " + def.name);
       continue;
     }
     const auto names = columnsOf(def.name);
-    for (const ColumnSpec& c : def.columns)
+    for (const ColumnDef& c : def.columns)
       if (!hasColumn(names, c.name)) report.missing.push_back("column " + def.name + "." + c.name);
   }
 

@@ -7,7 +7,7 @@ namespace belvane::data::tools {
 
 namespace {
 
-std::vector<TableSpec> MakeTables() {
+std::vector<TableDef> MakeTables() {
   return {
       {"ALLMODEL",
        {{"MODEL_ID", "INTEGER PRIMARY KEY"},
@@ -77,13 +77,13 @@ std::vector<TableSpec> MakeTables() {
 
 } // namespace
 
-const std::vector<TableSpec>& CatalogueTables() {
-  static const std::vector<TableSpec> tables = MakeTables();
+const std::vector<TableDef>& CatalogueTables() {
+  static const std::vector<TableDef> tables = MakeTables();
   return tables;
 }
 
-const TableSpec* FindCatalogueTable(std::string_view name) {
-  for (const TableSpec& t : CatalogueTables())
+const TableDef* FindCatalogueTable(std::string_view name) {
+  for (const TableDef& t : CatalogueTables())
     if (text::EqualsNoCase(t.name, name)) return &t;
   return nullptr;
 }
@@ -110,7 +110,7 @@ std::string QuoteName(std::string_view name) {
   return q + "\"";
 }
 
-std::string CreateTableSql(const TableSpec& table) {
+std::string CreateTableSql(const TableDef& table) {
   std::string sql = "CREATE TABLE " + QuoteName(table.name) + " (";
   for (size_t i = 0; i < table.columns.size(); ++i) {
     if (i) sql += ", ";
@@ -127,7 +127,7 @@ void CreateCatalogueTables(sqlite::Database& db, const std::vector<std::string>&
       if (text::EqualsNoCase(o, name)) return true;
     return false;
   };
-  for (const TableSpec& t : CatalogueTables())
+  for (const TableDef& t : CatalogueTables())
     if (!omitted(t.name)) db.Exec(CreateTableSql(t));
   if (omitted(kCipherColumnTable)) return;
   sqlite::Statement insert(db, "INSERT INTO CIPHER_COLUMN (table_name, column_name, rule) "
@@ -143,7 +143,7 @@ void CreateCatalogueTables(sqlite::Database& db, const std::vector<std::string>&
 }
 
 void CreateCatalogueIndexes(sqlite::Database& db) {
-  for (const TableSpec& t : CatalogueTables())
+  for (const TableDef& t : CatalogueTables())
     if (db.HasTable(t.name))
       for (const std::string& index : t.indexes)
         db.Exec(index);

@@ -12,22 +12,22 @@ class Database;
 
 namespace belvane::data::tools {
 
-struct ColumnSpec {
+struct ColumnDef {
   std::string name;
   std::string declaration; // type and constraints, as in CREATE TABLE
 };
 
-struct TableSpec {
+struct TableDef {
   std::string name;
-  std::vector<ColumnSpec> columns;
+  std::vector<ColumnDef> columns;
   std::string constraints;          // table constraints after the columns, or ""
   std::vector<std::string> indexes; // CREATE INDEX statements
 };
 
 // Every table of a catalogue, in the order the tools fill them.
-const std::vector<TableSpec>& CatalogueTables();
+const std::vector<TableDef>& CatalogueTables();
 // The table of that name (without regard to case), or nullptr.
-const TableSpec* FindCatalogueTable(std::string_view name);
+const TableDef* FindCatalogueTable(std::string_view name);
 
 // The table that lists the enciphered columns: CIPHER_COLUMN(table_name,
 // column_name, rule). rule "always": every value that is not blank is
@@ -53,7 +53,7 @@ void CreateCatalogueTables(sqlite::Database& db, const std::vector<std::string>&
 void CreateCatalogueIndexes(sqlite::Database& db);
 
 // The CREATE TABLE statement of a table.
-std::string CreateTableSql(const TableSpec& table);
+std::string CreateTableSql(const TableDef& table);
 // A column name as an SQL identifier ("Group" needs quotes).
 std::string QuoteName(std::string_view name);
 

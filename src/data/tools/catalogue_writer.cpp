@@ -42,7 +42,7 @@ void SqliteCatalogueWriter::Insert(std::string_view table, const std::vector<Val
     if (text::EqualsNoCase(omitted, table)) return;
   auto it = inserts_.find(table);
   if (it == inserts_.end()) {
-    const TableSpec* def = FindCatalogueTable(table);
+    const TableDef* def = FindCatalogueTable(table);
     if (!def) db_->Fail(err::kNoSuchTable, "no such catalogue table: " + std::string(table));
     std::string sql = "INSERT INTO " + QuoteName(def->name) + " (";
     std::string values;

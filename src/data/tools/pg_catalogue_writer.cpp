@@ -32,7 +32,7 @@ std::string Declaration(std::string decl) {
 
 } // namespace
 
-std::string PostgresCreateTableSql(const TableSpec& table) {
+std::string PostgresCreateTableSql(const TableDef& table) {
   std::string sql = "CREATE TABLE " + LowerName(table.name) + " (";
   for (size_t i = 0; i < table.columns.size(); ++i) {
     if (i) sql += ", ";
@@ -47,9 +47,9 @@ PostgresCatalogueWriter::PostgresCatalogueWriter(const std::string& conninfo,
                                                  std::vector<std::string> omitTables)
     : db_(std::make_unique<postgres::Connection>(conninfo)), omit_(std::move(omitTables)) {
   db_->Exec("BEGIN");
-  for (const TableSpec& t : CatalogueTables())
+  for (const TableDef& t : CatalogueTables())
     db_->Exec("DROP TABLE IF EXISTS " + LowerName(t.name));
-  for (const TableSpec& t : CatalogueTables())
+  for (const TableDef& t : CatalogueTables())
     if (!Omitted(t.name)) db_->Exec(PostgresCreateTableSql(t));
   if (Omitted(kCipherColumnTable)) return;
   for (const CipherColumn& c : StandardCipherColumns())
@@ -71,7 +71,7 @@ void PostgresCatalogueWriter::Insert(std::string_view table, const std::vector<V
   if (Omitted(table)) return;
   auto it = inserts_.find(table);
   if (it == inserts_.end()) {
-    const TableSpec* def = FindCatalogueTable(table);
+    const TableDef* def = FindCatalogueTable(table);
     if (!def) db_->Fail(err::kNoSuchTable, "no such catalogue table: " + std::string(table));
     std::string sql = "INSERT INTO " + LowerName(def->name) + " (";
     std::string values;
@@ -96,7 +96,7 @@ void PostgresCatalogueWriter::Insert(std::string_view table, const std::vector<V
 void PostgresCatalogueWriter::Commit() {
   // The schema's index statements name tables and columns unquoted, so they
   // fold to the lower-case names as they are.
-  for (const TableSpec& t : CatalogueTables())
+  for (const TableDef& t : CatalogueTables())
     if (!Omitted(t.name))
       for (const std::string& index : t.indexes)
         db_->Exec(index);

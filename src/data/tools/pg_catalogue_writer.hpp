@@ -21,7 +21,7 @@ namespace belvane::data::tools {
 // The CREATE TABLE statement of a catalogue table in PostgreSQL: names in
 // lower case, the types PostgreSQL has, and on the tables read in catalogue
 // order a row_no column numbering the rows as they were loaded.
-std::string PostgresCreateTableSql(const TableSpec& table);
+std::string PostgresCreateTableSql(const TableDef& table);
 
 // Replaces the catalogue in the database (the first schema of its search
 // path) in one transaction: the catalogue tables there are dropped and made
