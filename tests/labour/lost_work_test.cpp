@@ -224,5 +224,43 @@ TEST_F(LostWorkTest, ADeletionAloneIsAnEditTheCloseBoxAsksAbout) {
   EXPECT_EQ(Records(), (std::vector<std::string>{"100 R&R 1.5"}));
 }
 
+TEST_F(LostWorkTest, AHostRecordSetWithoutAFieldTheEditorWritesIsRefusedWhole) {
+  // A host's record set that lacks "subquote": no line can be kept.
+  quote = std::make_shared<data::Recordset>();
+  for (const char* f :
+       {"ITEMID", "DELITEM", "tag", "qtnno", "itemno", "script", "Category", "rrhour", "rahour",
+        "pthour", "report_on", "blend", "allow_tick", "Rev", "rr_rate2", "partno"})
+    quote->Fields().Append(f, std::string(f) == "ITEMID" ? data::DataType::Integer
+                                                         : data::DataType::Variant);
+  quote->Open();
+  quote->AddNew();
+  for (auto [field, value] :
+       std::initializer_list<std::pair<const char*, data::Value>>{{"ITEMID", int32_t{1}},
+                                                                  {"DELITEM", false},
+                                                                  {"tag", "1"},
+                                                                  {"qtnno", "Q1001"},
+                                                                  {"itemno", "100"},
+                                                                  {"script", "BONNET R&I"},
+                                                                  {"Category", "R&R"},
+                                                                  {"rrhour", 1.5},
+                                                                  {"allow_tick", "7"},
+                                                                  {"rr_rate2", 55.0}})
+    quote->Collect(field, value);
+  Stored();
+  Open(eEdit, [&](frmLabour& f) {
+    user.ClickCell(f.FGSelectedLabour, 1, col::kPTHours);
+    user.Type("2");
+    user.PressKey(keys::kEnter);
+    user.Click(f.cmdClose);
+    EXPECT_TRUE(f.Visible());
+    ASSERT_EQ(runtime.UnhandledErrors().size(), 1u);
+    EXPECT_NE(runtime.UnhandledErrors()[0].description.find("subquote"), std::string::npos);
+    runtime.Reset();
+    runtime.QueueAnswer(msgbox::kNo);
+  });
+  EXPECT_EQ(quote->StoredStatus(0), data::RecordStatus::Unchanged);
+  EXPECT_EQ(quote->RecordCount(), 1);
+}
+
 } // namespace
 } // namespace belvane::test
