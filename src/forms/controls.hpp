@@ -102,6 +102,14 @@ public:
   CommandButton(Form& form, std::string name, int index = -1);
   const std::string& Caption() const noexcept { return caption_; }
   void Caption(std::string caption);
+  // The name of the picture a picture button shows instead of (or beside)
+  // its caption: one of the names below; "" for a plain button. Views draw
+  // the picture that the name stands for.
+  static constexpr const char* kPictureSearch = "search";
+  static constexpr const char* kPictureBrowse = "browse";
+  static constexpr const char* kPictureDropDown = "dropdown";
+  const std::string& Picture() const noexcept { return picture_; }
+  void Picture(std::string name);
 
 protected:
   void ResetState() override;
@@ -111,6 +119,7 @@ protected:
 
 private:
   std::string caption_;
+  std::string picture_;
   bool spaceDown_ = false;
 };
 

@@ -12,6 +12,7 @@
 
 #include <QCheckBox>
 #include <QGroupBox>
+#include <QIcon>
 #include <QInputMethodEvent>
 #include <QLabel>
 #include <QLineEdit>
@@ -19,6 +20,7 @@
 #include <QPainter>
 #include <QPushButton>
 #include <QRadioButton>
+#include <QStyle>
 
 #include <limits>
 
@@ -98,11 +100,27 @@ public:
   void SyncAll() override {
     ControlView::SyncAll();
     Sync(grid::Property::Caption);
+    Sync(grid::Property::Picture);
   }
 
 protected:
   void Sync(grid::Property property) override {
-    if (property == grid::Property::Caption) widget_->setText(ToQString(button_.Caption()));
+    if (property == grid::Property::Caption) {
+      widget_->setText(ToQString(button_.Caption()));
+    } else if (property == grid::Property::Picture) {
+      widget_->setIcon(PictureIcon(button_.Picture()));
+    }
+  }
+  // The picture a picture name stands for, from the style's own icons.
+  QIcon PictureIcon(const std::string& name) const {
+    QStyle* style = widget_->style();
+    if (name == forms::CommandButton::kPictureSearch)
+      return style->standardIcon(QStyle::SP_FileDialogContentsView);
+    if (name == forms::CommandButton::kPictureBrowse)
+      return style->standardIcon(QStyle::SP_FileDialogListView);
+    if (name == forms::CommandButton::kPictureDropDown)
+      return style->standardIcon(QStyle::SP_ArrowDown);
+    return {};
   }
   // The button looks pressed while the mouse button is down on it.
   bool Mouse(QWidget* source, QMouseEvent* event) override {
