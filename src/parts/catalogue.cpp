@@ -12,6 +12,7 @@
 #include "text/strings.hpp"
 
 #include <array>
+#include <charconv>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -47,41 +48,63 @@ struct VehicleFields {
   }
 };
 
-bool IsBlank(const data::Value& v) { return v.IsNull() || text::Trim(v.ToText()).empty(); }
-
-// An enciphered value in clear; a blank one is empty.
-std::string Deciphered(const data::Value& v) {
-  const std::string stored = text::Trim(v.ToText());
-  return stored.empty() ? std::string() : cipher::DecryptField(stored);
+// A field's text without a copy where the value is a text already.
+std::string_view TextOf(const data::Value& v, std::string& scratch) {
+  if (const std::string* t = v.TextIf()) return *t;
+  scratch = v.ToText();
+  return scratch;
 }
 
-// The row of a vehicle part: the description deciphered, with the side in
-// front of it ("L/H FRONT GUARD") unless the part has no side ("O").
-std::string VehiclePartRow(data::Recordset& rs, const VehicleFields& f) {
+// Without the spaces at either end (as Trim).
+std::string_view Trimmed(std::string_view s) {
+  const size_t first = s.find_first_not_of(' ');
+  if (first == std::string_view::npos) return {};
+  return s.substr(first, s.find_last_not_of(' ') - first + 1);
+}
+
+// Appends an enciphered value in clear; a blank one is empty.
+void AppendDeciphered(std::string& row, const data::Value& v, std::string& scratch) {
+  const std::string_view stored = Trimmed(TextOf(v, scratch));
+  if (!stored.empty()) row += cipher::DecryptField(stored);
+}
+
+// Fills `row` with the row of a vehicle part: the description deciphered,
+// with the side in front of it ("L/H FRONT GUARD") unless the part has no
+// side ("O").
+void VehiclePartRow(data::Recordset& rs, const VehicleFields& f, std::string& row) {
   auto field = [&rs](size_t i) -> const data::Value& { return rs.Fields(i).Value(); };
-  const data::Value& partName = field(f.partName);
-  std::string description = IsBlank(partName) ? text::Trim(field(f.script).ToText())
-                                              : cipher::DecryptField(text::Trim(partName.ToText()));
+  std::string scratch;
+  row.clear();
+  row += TextOf(field(f.itemNo), scratch);
+  row += '\t';
   const data::Value& side = field(f.side);
+  std::string sideText;
   if (!side.IsNull()) {
-    const std::string s = text::Trim(side.ToText());
-    if (text::UCase(s) != "O") description = s + "/H " + description;
+    sideText = side.ToText();
+    const std::string_view s = Trimmed(sideText);
+    if (!(s.size() == 1 && (s[0] == 'O' || s[0] == 'o'))) {
+      row += s;
+      row += "/H ";
+    }
   }
+  const data::Value& partName = field(f.partName);
+  const std::string_view name =
+      partName.IsNull() ? std::string_view() : Trimmed(TextOf(partName, scratch));
+  if (name.empty())
+    row += Trimmed(TextOf(field(f.script), scratch));
+  else
+    row += cipher::DecryptField(name);
+  row += '\t';
+  row += sideText;
+  row += '\t';
+  row += TextOf(field(f.qty), scratch);
+  row += '\t';
   const data::Value& unitcost = field(f.unitcost);
-  std::string row = field(f.itemNo).ToText();
-  row += '\t';
-  row += description;
-  row += '\t';
-  row += side.ToText();
-  row += '\t';
-  row += field(f.qty).ToText();
-  row += '\t';
   row += text::FormatNumber(unitcost.IsNull() ? 0 : unitcost.ToDouble(), text::kHours);
   row += '\t';
-  row += Deciphered(field(f.partNo));
+  AppendDeciphered(row, field(f.partNo), scratch);
   row += '\t';
-  row += Deciphered(field(f.group));
-  return row;
+  AppendDeciphered(row, field(f.group), scratch);
 }
 
 // Whether `haystack` holds `needleUpper` (a text in upper case) without
@@ -132,8 +155,11 @@ void frmParts::LoadVehicleParts(const std::string& make, const std::string& catN
     catalogue->GetVehicleParts(rs, make, catNo, body, state);
     if (rs && rs->State() == data::adStateOpen) {
       const VehicleFields fields(*rs);
-      for (; !rs->Eof(); rs->MoveNext())
-        FGParts.AddItem(VehiclePartRow(*rs, fields));
+      std::string row;
+      for (; !rs->Eof(); rs->MoveNext()) {
+        VehiclePartRow(*rs, fields, row);
+        FGParts.AddItem(row);
+      }
       rs->Close();
     }
   } catch (const Error& e) {
@@ -276,16 +302,18 @@ void frmParts::SearchParts() {
   {
     editor::RedrawSuspended suspended(fgSearch);
     const grid::FlexGrid& parts = FGParts;
+    std::string row;
     for (int r = 1; r < parts.Rows(); ++r) {
       if (!ContainsNoCase(parts.TextView(r, cat::kItemNo), needle, asciiNeedle) &&
           !ContainsNoCase(parts.TextView(r, cat::kDescription), needle, asciiNeedle))
         continue;
-      std::string row;
+      row.clear();
       for (int c = cat::kItemNo; c <= cat::kPartNo; ++c) {
         row += parts.TextView(r, c);
         row += '\t';
       }
-      row += std::to_string(r);
+      char number[16];
+      row.append(number, std::to_chars(number, number + sizeof number, r).ptr);
       fgSearch.AddItem(row);
     }
   }
