@@ -1,6 +1,7 @@
 #include "entry/cforms.hpp"
 
 #include "labour/frm_labour.hpp"
+#include "parts/frm_parts.hpp"
 
 namespace belvane {
 
@@ -19,6 +20,25 @@ long CForms::ShowLabourForm(data::RecordsetPtr& prsLab, std::string& psSchedType
 
 long CForms::SaveLabourChanges() {
   if (host::gbLabourFormLoaded) labour::LabourForm().SaveChanges();
+  return 0;
+}
+
+data::Value CForms::ShowPartsForm(data::RecordsetPtr& prsParts, const std::string& psQtnNo,
+                                  const std::string& psSubQuoteNo, const std::string& psMake,
+                                  const std::string& psModelID, const std::string& psBodyID,
+                                  double pdNewMarkup, double pdUsedMarkup, double pdRecoreMarkup,
+                                  double pdAfterMarketMarkup, double pdOldNewMarkup,
+                                  double pdOldUsedMarkup, double pdOldRecoreMarkup,
+                                  double pdOldAfterMarketMarkup, EQuoteEditMode peMode) {
+  parts::PartsForm().SetQuoteNo(prsParts, psQtnNo, psSubQuoteNo, psMake, psModelID, psBodyID,
+                                pdNewMarkup, pdUsedMarkup, pdRecoreMarkup, pdAfterMarketMarkup,
+                                pdOldNewMarkup, pdOldUsedMarkup, pdOldRecoreMarkup,
+                                pdOldAfterMarketMarkup, peMode);
+  return data::Value();
+}
+
+long CForms::SavePartsChanges() {
+  if (host::gbPartsFormLoaded) parts::PartsForm().SaveChanges();
   return 0;
 }
 

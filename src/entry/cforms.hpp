@@ -8,6 +8,7 @@
 // failure inside an editor reaches the host as belvane::Error from the call.
 
 #include "data/recordset.hpp"
+#include "data/value.hpp"
 #include "host/component_state.hpp"
 
 #include <string>
@@ -32,6 +33,24 @@ public:
   // writes its lines into the record set; otherwise does nothing. Never
   // loads the editor. Returns 0.
   long SaveLabourChanges();
+
+  // Opens the parts editor modally over `prsParts` (the host's record set
+  // of parts: the editor reads and writes this very object), with the
+  // quote's vehicle and the current and previous markup percentages of new,
+  // used (also exchange), recore and after-market parts. Returns an empty
+  // value (Null).
+  data::Value ShowPartsForm(data::RecordsetPtr& prsParts, const std::string& psQtnNo,
+                            const std::string& psSubQuoteNo, const std::string& psMake,
+                            const std::string& psModelID, const std::string& psBodyID,
+                            double pdNewMarkup, double pdUsedMarkup, double pdRecoreMarkup,
+                            double pdAfterMarketMarkup, double pdOldNewMarkup,
+                            double pdOldUsedMarkup, double pdOldRecoreMarkup,
+                            double pdOldAfterMarketMarkup, EQuoteEditMode peMode);
+
+  // While the parts editor is loaded (a call made during its session),
+  // writes its parts into the record set; otherwise does nothing. Never
+  // loads the editor. Returns 0.
+  long SavePartsChanges();
 };
 
 } // namespace belvane

@@ -53,18 +53,18 @@ void CommandButton::Caption(std::string caption) {
   NotifyProperty(grid::Property::Caption);
 }
 
-void CommandButton::Picture(std::string picture) {
-  picture_ = std::move(picture);
+void CommandButton::Picture(std::string name) {
+  picture_ = std::move(name);
   NotifyProperty(grid::Property::Picture);
 }
 
 void CommandButton::ResetState() {
   caption_.clear();
   picture_.clear();
-  NotifyProperty(grid::Property::Picture);
   spaceDown_ = false;
   ResetCommon();
   NotifyProperty(grid::Property::Caption);
+  NotifyProperty(grid::Property::Picture);
 }
 
 // A button is pressed by Space (on release) and by Enter.

@@ -22,6 +22,7 @@ enum class Property : std::uint8_t {
   BackColor,
   ForeColor,
   Caption,
+  Picture, // a button's picture
   Text,
   Selection, // text box caret and selection
   MaxLength,

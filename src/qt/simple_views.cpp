@@ -12,6 +12,7 @@
 
 #include <QCheckBox>
 #include <QGroupBox>
+#include <QIcon>
 #include <QInputMethodEvent>
 #include <QLabel>
 #include <QLineEdit>
@@ -104,19 +105,22 @@ public:
 
 protected:
   void Sync(grid::Property property) override {
-    if (property == grid::Property::Caption) widget_->setText(ToQString(button_.Caption()));
-    if (property == grid::Property::Picture) widget_->setIcon(PictureIcon(button_.Picture()));
+    if (property == grid::Property::Caption) {
+      widget_->setText(ToQString(button_.Caption()));
+    } else if (property == grid::Property::Picture) {
+      widget_->setIcon(PictureIcon(button_.Picture()));
+    }
   }
-  // The pictures the model names, drawn with the desktop style's own icons;
-  // any other name is an image file.
-  QIcon PictureIcon(const std::string& picture) const {
-    if (picture.empty()) return {};
+  // The picture a picture name stands for, from the style's own icons.
+  QIcon PictureIcon(const std::string& name) const {
     QStyle* style = widget_->style();
-    if (picture == forms::kPictureSearch)
+    if (name == forms::CommandButton::kPictureSearch)
       return style->standardIcon(QStyle::SP_FileDialogContentsView);
-    if (picture == forms::kPictureBrowse) return style->standardIcon(QStyle::SP_ArrowBack);
-    if (picture == forms::kPictureDropDown) return style->standardIcon(QStyle::SP_ArrowDown);
-    return QIcon(ToQString(picture));
+    if (name == forms::CommandButton::kPictureBrowse)
+      return style->standardIcon(QStyle::SP_FileDialogListView);
+    if (name == forms::CommandButton::kPictureDropDown)
+      return style->standardIcon(QStyle::SP_ArrowDown);
+    return {};
   }
   // The button looks pressed while the mouse button is down on it.
   bool Mouse(QWidget* source, QMouseEvent* event) override {

@@ -49,7 +49,7 @@ protected:
     ScaleWidth(4800);
     ScaleHeight(3000);
     txtType.Move(120, 120, 1815, 285);
-    CB1.Picture(belvane::forms::kPictureDropDown);
+    CB1.Picture(belvane::forms::CommandButton::kPictureDropDown);
     CB1.Move(1935, 120, 285, 285);
     LV1.Visible(false);
     LV1.ColumnHeaderText("Part type");
