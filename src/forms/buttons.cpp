@@ -61,10 +61,10 @@ void CommandButton::Picture(std::string name) {
 void CommandButton::ResetState() {
   caption_.clear();
   picture_.clear();
+  NotifyProperty(grid::Property::Picture);
   spaceDown_ = false;
   ResetCommon();
   NotifyProperty(grid::Property::Caption);
-  NotifyProperty(grid::Property::Picture);
 }
 
 // A button is pressed by Space (on release) and by Enter.

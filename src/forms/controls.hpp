@@ -223,14 +223,22 @@ private:
 
 // The element and document stand-ins of a page shown in a WebBrowser: what
 // the editors read and trap on a page. The desktop view fills them from the
-// real page; headless, a test builds them.
+// real page; headless, the page host (page_host.hpp) reads them from the
+// page's file, or a test builds them.
 class HtmlElement {
 public:
   HtmlElement(std::string id, std::string tagName);
   const std::string& Id() const noexcept { return id_; }
+  // The element's name attribute (empty for none).
+  const std::string& Name() const noexcept { return name_; }
+  void Name(std::string name) { name_ = std::move(name); }
+  // In lower case ("input").
   const std::string& TagName() const noexcept { return tagName_; }
   const std::string& Value() const noexcept { return value_; }
   void Value(std::string value) { value_ = std::move(value); }
+  // An attribute by its lower-case name; nullptr when the element has none.
+  const std::string* Attribute(std::string_view name) const;
+  void Attribute(std::string name, std::string value);
   // The page clicks the element: runs OnClick; false when the handler
   // cancelled the element's default action.
   bool Click();
@@ -238,18 +246,36 @@ public:
 
 private:
   std::string id_;
+  std::string name_;
   std::string tagName_;
   std::string value_;
+  std::vector<std::pair<std::string, std::string>> attributes_;
 };
 
 class HtmlDocument {
 public:
   HtmlElement& AddElement(std::string id, std::string tagName = "input");
-  // The document's `all` collection: an element by name or id.
+  // The document's `all` collection: the first element whose id or name is
+  // `nameOrId`.
   HtmlElement* Find(std::string_view nameOrId);
+  const std::vector<std::unique_ptr<HtmlElement>>& Elements() const noexcept { return elements_; }
+  const std::string& Title() const noexcept { return title_; }
+  void Title(std::string title) { title_ = std::move(title); }
+  // The browser's own page telling that the address could not be shown.
+  bool IsErrorPage() const noexcept { return errorPage_; }
+  void IsErrorPage(bool error) { errorPage_ = error; }
+
+  // The stand-ins of a page from its HTML text: every element that has an
+  // id, a name or data- attributes, with its tag, attributes and the value
+  // attribute as its value, and the page's title. Script and style contents
+  // and comments are skipped. Any text is read without failing; what is not
+  // HTML yields no elements.
+  static std::shared_ptr<HtmlDocument> FromHtml(std::string_view html);
 
 private:
   std::vector<std::unique_ptr<HtmlElement>> elements_;
+  std::string title_;
+  bool errorPage_ = false;
 };
 
 class WebBrowser : public ControlOf<grid::ControlModel> {
@@ -261,6 +287,8 @@ public:
   const std::string& LocationURL() const noexcept { return url_; }
   bool Busy() const noexcept { return busy_; }
   HtmlDocument* Document() const noexcept { return document_.get(); }
+  // The document, shared: kept alive while a caller works on it.
+  std::shared_ptr<HtmlDocument> DocumentHandle() const noexcept { return document_; }
   // The page finished loading (called by the view, or by a test headless):
   // the document becomes current, then DownloadComplete and
   // DocumentComplete fire.

@@ -35,7 +35,6 @@ enum class Property : std::uint8_t {
   Location,     // web browser address
   Redraw,
   TabOrder,
-  Picture, // a button's picture
 };
 
 class ModelObserver {

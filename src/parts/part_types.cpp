@@ -112,8 +112,9 @@ void frmParts::cmdDelete_Click() {
   if (!id.empty()) editor::AddRemovedItem(*mrsDeletedItems, id);
   if (r > 1 || g.Rows() > 2) {
     g.RemoveItem(r);
-    // Fewer than ten parts: the scroll bar goes, and its room with it.
-    if (g.Rows() == 10)
+    // Left with exactly eleven rows (ten parts), the description takes back
+    // the scroll bar's room, as the labour editor's delete does.
+    if (g.Rows() == 11)
       g.ColWidth(sel::kDescription, g.ColWidth(sel::kDescription) + editor::kRowStepTwips);
   } else {
     // The only part: its row stays as the empty placeholder.
