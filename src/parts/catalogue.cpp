@@ -4,6 +4,7 @@
 
 #include "data/catalogue.hpp"
 #include "cipher/field.hpp"
+#include "diagram/frm_butterfly.hpp"
 #include "editor/grid_layout.hpp"
 #include "forms/runtime.hpp"
 #include "parts/frm_parts.hpp"
@@ -314,6 +315,34 @@ void frmParts::SearchParts() {
       }
       char number[16];
       row.append(number, std::to_chars(number, number + sizeof number, r).ptr);
+      fgSearch.AddItem(row);
+    }
+  }
+  ShowSearchResults();
+}
+
+void frmParts::SearchByDiagramGroup() {
+  // The estimator picks a panel on the vehicle diagram; every available
+  // part whose group is that panel's group, as a whole text in any case,
+  // is listed as the text search lists its results.
+  const bool hasDiagram = data::Catalogue()->HasVehicleDiagram(text::Trim(msMake));
+  diagram::frmButterfly& picker = diagram::ButterflyForm();
+  picker.ShowForm(hasDiagram);
+  if (!picker.mbSearchGroup) return; // cancelled or closed: nothing changes
+  const std::string group = text::UCase(picker.msSearchStr);
+
+  ClearSearchResults();
+  {
+    editor::RedrawSuspended suspended(fgSearch);
+    const grid::FlexGrid& parts = FGParts;
+    std::string row;
+    for (int r = 1; r < parts.Rows(); ++r) {
+      if (text::UCase(parts.TextView(r, cat::kGroup)) != group) continue;
+      row.clear();
+      for (int c = cat::kItemNo; c <= cat::kGroup; ++c) {
+        if (c) row += '\t';
+        row += parts.TextView(r, c);
+      }
       fgSearch.AddItem(row);
     }
   }

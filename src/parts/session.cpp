@@ -4,6 +4,7 @@
 
 #include "cipher/field.hpp"
 #include "data/catalogue.hpp"
+#include "diagram/frm_butterfly.hpp"
 #include "editor/grid_layout.hpp"
 #include "editor/modal_session.hpp"
 #include "editor/quote_items.hpp"
@@ -291,10 +292,6 @@ void frmParts::cmdSearch_Click(int index) {
     BrowseAvailableParts();
 }
 
-void frmParts::SearchByDiagramGroup() {
-  // Connected to the diagram window when that window joins the component.
-}
-
 std::vector<std::string> frmParts::SelectedGridTexts() const {
   const grid::FlexGrid& g = FGSelectedParts;
   std::vector<std::string> rows;
@@ -344,6 +341,8 @@ void frmParts::Form_QueryUnload(int& cancel, int unloadMode) {
 
 void frmParts::Form_Unload(int& /*cancel*/) {
   host::gbPartsFormLoaded = false;
+  // The diagram window goes with the editor; one never shown is not made.
+  diagram::UnloadButterflyForm();
   if (meMode == eEdit && mrsDeletedItems && mrsDeletedItems->State() == data::adStateOpen)
     mrsDeletedItems->Close();
   data::RecordsetPtr parts = std::move(mrsParts);
