@@ -92,15 +92,14 @@ QuoteWindow::QuoteWindow(data::QuoteStore& store, QWidget* parent)
   auto* buttons = new QHBoxLayout;
   editLabour_ = new QPushButton("&Edit labour...", right);
   viewLabour_ = new QPushButton("&View labour...", right);
-  editParts_ = new QPushButton("Edit parts...", right);
-  viewParts_ = new QPushButton("View parts...", right);
+  editParts_ = new QPushButton("Edit &parts...", right);
+  viewParts_ = new QPushButton("Vie&w parts...", right);
   editLabour_->setToolTip("Open the labour editor on this quote; what you change is stored "
                           "when you close it");
   viewLabour_->setToolTip("Open the labour editor to look at this quote's labour lines");
-  for (QPushButton* parts : {editParts_, viewParts_}) {
-    parts->setEnabled(false);
-    parts->setToolTip("The parts editor comes with a later release");
-  }
+  editParts_->setToolTip("Open the parts editor on this quote; what you change is stored when "
+                         "you close it");
+  viewParts_->setToolTip("Open the parts editor to look at this quote's parts");
   for (QPushButton* b : {editLabour_, viewLabour_, editParts_, viewParts_})
     buttons->addWidget(b);
   buttons->addStretch();
@@ -139,9 +138,12 @@ QuoteWindow::QuoteWindow(data::QuoteStore& store, QWidget* parent)
   connect(quotes_, &QTableWidget::cellDoubleClicked, this, [this] { OpenLabour(eEdit); });
   connect(editLabour_, &QPushButton::clicked, this, [this] { OpenLabour(eEdit); });
   connect(viewLabour_, &QPushButton::clicked, this, [this] { OpenLabour(eView); });
+  connect(editParts_, &QPushButton::clicked, this, [this] { OpenParts(eEdit); });
+  connect(viewParts_, &QPushButton::clicked, this, [this] { OpenParts(eView); });
 
   Reload();
-  statusBar()->showMessage("Select a quote, then Edit labour to open the labour editor.");
+  statusBar()->showMessage(
+      "Select a quote, then Edit labour or Edit parts to open the labour or the parts editor.");
 }
 
 void QuoteWindow::Reload() {
@@ -179,8 +181,8 @@ std::string QuoteWindow::CurrentQuote() const {
 
 void QuoteWindow::ShowQuote() {
   const auto header = store_.GetQuote(CurrentQuote());
-  editLabour_->setEnabled(header.has_value());
-  viewLabour_->setEnabled(header.has_value());
+  for (QPushButton* b : {editLabour_, viewLabour_, editParts_, viewParts_})
+    b->setEnabled(header.has_value());
   lines_->setRowCount(0);
   parts_->setRowCount(0);
   if (!header) {
@@ -251,27 +253,48 @@ void QuoteWindow::ShowQuote() {
 void QuoteWindow::Report(const std::string& message) { statusBar()->showMessage(Q(message)); }
 
 std::string QuoteWindow::OpenLabour(EQuoteEditMode mode) {
+  return OpenEditor(mode, data::ItemKind::Labour,
+                    [this, mode](data::RecordsetPtr& items, data::QuoteHeader& header) {
+                      std::string schedType = header.schedType;
+                      state_->forms.ShowLabourForm(
+                          items, schedType, header.qtnno, header.subquote, header.make,
+                          header.modelId, header.bodyId, header.schedId, header.mtaId,
+                          header.thirdId, header.rrRate, header.raRate, header.ptRate,
+                          header.defaultSched, header.insurerChanged, mode);
+                      if (mode != eEdit || schedType == header.schedType) return std::string();
+                      header.schedType = schedType;
+                      return " Schedule now " + schedType + ".";
+                    });
+}
+
+std::string QuoteWindow::OpenParts(EQuoteEditMode mode) {
+  return OpenEditor(mode, data::ItemKind::Parts,
+                    [this, mode](data::RecordsetPtr& items, data::QuoteHeader& header) {
+                      state_->forms.ShowPartsForm(
+                          items, header.qtnno, header.subquote, header.make, header.modelId,
+                          header.bodyId, header.newMarkup, header.usedMarkup, header.recoreMarkup,
+                          header.afterMarketMarkup, header.oldNewMarkup, header.oldUsedMarkup,
+                          header.oldRecoreMarkup, header.oldAfterMarketMarkup, mode);
+                      return std::string();
+                    });
+}
+
+std::string QuoteWindow::OpenEditor(EQuoteEditMode mode, data::ItemKind kind,
+                                    const EditorCall& open) {
   auto header = store_.GetQuote(CurrentQuote());
   if (!header) return {};
   const std::string qtnno = header->qtnno;
+  const std::string schedType = header->schedType;
   std::string message;
   try {
-    data::RecordsetPtr items = store_.LoadItems(qtnno, data::ItemKind::Labour);
-    std::string schedType = header->schedType;
-    state_->forms.ShowLabourForm(items, schedType, qtnno, header->subquote, header->make,
-                                 header->modelId, header->bodyId, header->schedId, header->mtaId,
-                                 header->thirdId, header->rrRate, header->raRate, header->ptRate,
-                                 header->defaultSched, header->insurerChanged, mode);
+    data::RecordsetPtr items = store_.LoadItems(qtnno, kind);
+    const std::string more = open(items, *header);
     if (mode == eEdit) {
       const data::SaveSummary saved = store_.SaveItems(qtnno, *items);
       message = qtnno + ": stored " + std::to_string(saved.inserted) + " new, " +
                 std::to_string(saved.updated) + " changed and " + std::to_string(saved.deleted) +
-                " deleted records.";
-      if (schedType != header->schedType) {
-        header->schedType = schedType;
-        store_.SaveQuote(*header);
-        message += " Schedule now " + schedType + ".";
-      }
+                " deleted records." + more;
+      if (header->schedType != schedType) store_.SaveQuote(*header);
     } else {
       message = qtnno + ": viewed, nothing to store.";
     }

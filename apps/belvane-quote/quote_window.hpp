@@ -1,7 +1,7 @@
 #pragma once
 // The demo host's main window: the quotes of the database with their
 // vehicles, the selected quote's context, buttons that open the labour
-// editor in edit or view mode, and the quote's labour lines, parts and
+// or parts editor in edit or view mode, and the quote's labour lines, parts and
 // totals (labour, parts at cost and with markup, margin), read again from
 // the database after each edit.
 //
@@ -14,6 +14,7 @@
 
 #include <QMainWindow>
 
+#include <functional>
 #include <memory>
 #include <string>
 
@@ -23,7 +24,11 @@ class QTableWidget;
 
 namespace belvane::data {
 class QuoteStore;
-}
+class Recordset;
+struct QuoteHeader;
+enum class ItemKind;
+using RecordsetPtr = std::shared_ptr<Recordset>;
+} // namespace belvane::data
 
 namespace belvane::quote {
 
@@ -40,10 +45,14 @@ public:
   // The labour editor over the selected quote; returns what was done (also
   // shown in the status bar).
   std::string OpenLabour(EQuoteEditMode mode);
+  // The parts editor over the selected quote's parts, likewise.
+  std::string OpenParts(EQuoteEditMode mode);
   data::QuoteStore& Store() const noexcept { return store_; }
 
   QPushButton* EditLabourButton() const noexcept { return editLabour_; }
   QPushButton* ViewLabourButton() const noexcept { return viewLabour_; }
+  QPushButton* EditPartsButton() const noexcept { return editParts_; }
+  QPushButton* ViewPartsButton() const noexcept { return viewParts_; }
   QTableWidget* QuoteList() const noexcept { return quotes_; }
   QTableWidget* Lines() const noexcept { return lines_; }
   QTableWidget* Parts() const noexcept { return parts_; }
@@ -51,6 +60,11 @@ public:
 
 private:
   void ShowQuote();
+  // Loads the quote's items of one kind, runs an editor over them (`open`
+  // returns what more it has to report) and, in edit mode, stores what
+  // changed; a failure stores nothing and says why.
+  using EditorCall = std::function<std::string(data::RecordsetPtr&, data::QuoteHeader&)>;
+  std::string OpenEditor(EQuoteEditMode mode, data::ItemKind kind, const EditorCall& open);
   void Report(const std::string& message);
 
   struct State; // the quote list and CForms

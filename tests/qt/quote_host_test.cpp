@@ -5,6 +5,7 @@
 #include "data/catalogue.hpp"
 #include "data/quote_store.hpp"
 #include "labour/frm_labour.hpp"
+#include "parts/frm_parts.hpp"
 #include "qt/grid_view.hpp"
 #include "qt/qt_runtime.hpp"
 #include "quote_summary.hpp"
@@ -204,4 +205,38 @@ TEST_F(QuoteHostTest, SampleQuotesCarryPartsOfEveryTypeAndTheTotalsAddThem) {
   EXPECT_EQ(totals->item(6, 0)->text(), "Parts margin");
   EXPECT_EQ(totals->item(6, 2)->text().toStdString(), quote::Hours(sell - cost));
   EXPECT_EQ(totals->item(7, 2)->text().toStdString(), quote::Hours(labour.TotalAmount() + sell));
+}
+
+TEST_F(QuoteHostTest, ThePartsEditorOpensOverTheQuotesPartsAndItsEditIsStored) {
+  quote::QuoteWindow window(store);
+  window.show();
+  ASSERT_TRUE(window.SelectQuote("Q1001"));
+  const size_t before = quote::StoredPartsSummary(store, "Q1001").lines.size();
+  std::string removed;
+  runtime_->QueueModal([&](forms::Form& f) {
+    auto& form = static_cast<parts::frmParts&>(f);
+    ASSERT_TRUE(QTest::qWaitForWindowActive(runtime_->Window(form)));
+    ASSERT_EQ(form.FGSelectedParts.Rows(), static_cast<int>(before) + 1);
+    EXPECT_GT(form.FGParts.Rows(), 2); // the vehicle's catalogue
+    removed = form.FGSelectedParts.TextMatrix(1, parts::col::sel::kItemId);
+    form.FGSelectedParts.SetCurrentCell(1, 0);
+    QTest::mouseClick(runtime_->Widget(form.cmdDelete), Qt::LeftButton);
+    QTest::mouseClick(runtime_->Widget(form.cmdClose), Qt::LeftButton);
+  });
+  QTest::mouseClick(window.EditPartsButton(), Qt::LeftButton);
+  EXPECT_EQ(quote::StoredPartsSummary(store, "Q1001").lines.size(), before - 1);
+  EXPECT_EQ(window.Parts()->rowCount(), static_cast<int>(before) - 1);
+  // The used part was priced with the markup before the current one: the
+  // editor repriced it, and the write-back stored the new price.
+  EXPECT_EQ(window.statusBar()->currentMessage(),
+            "Q1001: stored 0 new, 1 changed and 1 deleted records.");
+
+  // Viewing stores nothing.
+  runtime_->QueueModal([&](forms::Form& f) {
+    auto& form = static_cast<parts::frmParts&>(f);
+    EXPECT_FALSE(form.cmdDelete.Enabled());
+    QTest::mouseClick(runtime_->Widget(form.cmdClose), Qt::LeftButton);
+  });
+  QTest::mouseClick(window.ViewPartsButton(), Qt::LeftButton);
+  EXPECT_EQ(window.statusBar()->currentMessage(), "Q1001: viewed, nothing to store.");
 }
