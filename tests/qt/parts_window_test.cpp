@@ -14,6 +14,8 @@
 
 #include <QAbstractItemModel>
 #include <QApplication>
+#include <QHeaderView>
+#include <QImage>
 #include <QLabel>
 #include <QLineEdit>
 #include <QMessageBox>
@@ -208,6 +210,14 @@ TEST_F(PartsWindowTest, AnEstimatorAddsAnExchangePartWithKeysAndClicks) {
     EXPECT_EQ(InWindow(editor).right() + 1, InWindow(button).left());
     EXPECT_EQ(List(form)->model()->rowCount(), 5);
     EXPECT_EQ(List(form)->model()->index(2, 0).data().toString(), "eXchange(X)");
+    // A line round the list sets it off from the grid and the window; the
+    // items beneath it keep the model's heights and take the clicks.
+    const QImage shown = list->grab().toImage();
+    const QColor edge = list->palette().color(QPalette::Shadow);
+    EXPECT_EQ(shown.pixelColor(0, shown.height() - 1).rgb(), edge.rgb());
+    EXPECT_EQ(shown.pixelColor(shown.width() - 1, shown.height() / 2).rgb(), edge.rgb());
+    EXPECT_EQ(List(form)->visualRect(List(form)->model()->index(4, 0)).height(),
+              List(form)->verticalHeader()->defaultSectionSize());
     Picture(form, "parts-cell-editor.png");
     ClickItem(form, 3); // "eXchange(X)" with the mouse
     EXPECT_FALSE(list->isVisible());
