@@ -291,6 +291,16 @@ TEST_F(PartsWindowTest, TheListGoesAboveTheCellWhereThereIsNoRoomBelow) {
   OpenWindow(eEdit, [&](frmParts& form) {
     auto& g = form.FGSelectedParts;
     QWidget* list = Qt().Widget(form.LV1);
+    // The cell the editor starts on: Escape brings back its text.
+    ASSERT_EQ(g.Col(), sel::kDescription);
+    DoubleClickCell(g, 1, sel::kDescription);
+    ASSERT_TRUE(Editor(form)->isVisible());
+    Type("XY");
+    EXPECT_EQ(Shown(g, 1, sel::kDescription), "PART 1XY");
+    Key(Qt::Key_Escape);
+    EXPECT_EQ(Editor(form)->text(), "PART 1");
+    EXPECT_EQ(Shown(g, 1, sel::kDescription), "PART 1");
+    Key(Qt::Key_Return);
     DoubleClickCell(g, 6, sel::kType);
     ASSERT_TRUE(list->isVisible());
     const QRect cell = CellInWindow(g, 6, sel::kType);
