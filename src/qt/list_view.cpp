@@ -4,12 +4,48 @@
 
 #include <QEvent>
 #include <QHeaderView>
+#include <QPainter>
 #include <QStandardItemModel>
 #include <QTableView>
 
 #include <algorithm>
 
 namespace belvane::qt {
+
+namespace {
+
+// A thin line round the list, drawn over its edges: the list drops over the
+// grid and the window, and without an edge its last items run into the
+// window's background. Drawn on top rather than as the table's frame, so the
+// header and the items keep the model's heights and no item is cut off.
+class ListOutline : public QWidget {
+public:
+  explicit ListOutline(QWidget* list) : QWidget(list) {
+    setObjectName("ListOutline");
+    setAttribute(Qt::WA_TransparentForMouseEvents);
+    setAttribute(Qt::WA_NoSystemBackground);
+    setFocusPolicy(Qt::NoFocus);
+    list->installEventFilter(this);
+    setGeometry(list->rect());
+    raise();
+  }
+
+protected:
+  bool eventFilter(QObject* watched, QEvent* event) override {
+    if (watched == parent() && (event->type() == QEvent::Resize || event->type() == QEvent::Show)) {
+      setGeometry(parentWidget()->rect());
+      raise();
+    }
+    return false;
+  }
+  void paintEvent(QPaintEvent*) override {
+    QPainter painter(this);
+    painter.setPen(palette().color(QPalette::Shadow));
+    painter.drawRect(rect().adjusted(0, 0, -1, -1));
+  }
+};
+
+} // namespace
 
 ListViewView::ListViewView(FormWindow& window, forms::ListView& list, QWidget* parent)
     : ControlView(window, list, new QTableView(parent)), list_(list),
@@ -37,6 +73,7 @@ ListViewView::ListViewView(FormWindow& window, forms::ListView& list, QWidget* p
   header->setHighlightSections(false);
   header->setDefaultAlignment(Qt::AlignLeft | Qt::AlignVCenter);
   table_->setFrameShape(QFrame::NoFrame);
+  new ListOutline(table_);
   Watch(table_->viewport());
   Watch(header->viewport());
 }
