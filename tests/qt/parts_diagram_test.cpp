@@ -63,8 +63,8 @@ TEST_F(PartsDiagramTest, APanelClickedOnTheDiagramListsItsGroupsParts) {
     auto& f = static_cast<parts::frmParts&>(form);
     ASSERT_TRUE(QTest::qWaitForWindowActive(qt_->Window(f)));
     bool clicked = false;
-    qt_->QueueModal([&](forms::Form& form) {
-      auto& picker = static_cast<diagram::frmButterfly&>(form);
+    qt_->QueueModal([&](forms::Form& shown) {
+      auto& picker = static_cast<diagram::frmButterfly&>(shown);
       ASSERT_TRUE(QTest::qWaitForWindowActive(qt_->Window(picker)));
       auto* view = dynamic_cast<qt::WebView*>(qt_->View(picker.wb1));
       ASSERT_NE(view, nullptr);
