@@ -4,8 +4,16 @@
 // the session ends (however it ends), and the session unloads only a form
 // it loaded itself.
 
+#include <functional>
 #include <string>
+#include <vector>
 
+namespace belvane::data {
+class Recordset;
+}
+namespace belvane::grid {
+class FlexGrid;
+}
 namespace belvane::forms {
 class Form;
 }
@@ -35,5 +43,22 @@ public:
 // no editor loaded behind it for a save call to reach. Call it only on a
 // form that is not loaded (see RefuseWhileLoaded).
 void RunModalSession(forms::Form& form);
+
+// The data rows of a grid, one tab-separated text per row: the lines as
+// loaded, to compare with when the window closes.
+std::vector<std::string> GridRowTexts(const grid::FlexGrid& grid);
+
+// The estimator changed the lines since they were loaded: a stored line is
+// on the removed-items list, or a row's texts differ from the snapshot.
+bool LinesChanged(const grid::FlexGrid& grid, const std::vector<std::string>& loaded,
+                  const data::Recordset* removed);
+
+// Closing the window otherwise than by Close, with edits in hand: asks
+// `question` (Yes, No, Cancel; No by default, so a session ended without an
+// answer closes without writing, as the close box always did). Yes runs
+// `write`; Cancel, or a write that is refused (its error goes on to the
+// caller), keeps the window open (cancel = 1).
+void AskBeforeDiscarding(const std::string& question, const std::string& title,
+                         const std::function<void()>& write, int& cancel);
 
 } // namespace belvane::editor

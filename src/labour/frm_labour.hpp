@@ -126,11 +126,6 @@ private:
   void EnableEditControls(bool enabled);
   void optSchedule_Click(int index);
   void cmdClose_Click();
-  // The selected grid's texts, row by row, as a snapshot to compare with.
-  std::vector<std::string> SelectedGridTexts() const;
-  // The estimator changed the lines since they were loaded (texts or
-  // deletions).
-  bool LinesEdited() const;
 
   // ---- store (store.cpp) ----
   void LoadSelectedItems();

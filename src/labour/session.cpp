@@ -269,7 +269,7 @@ void frmLabour::Form_Load() {
   }
   // What the close box compares with: the lines as loaded, also when the
   // load stopped part way.
-  mvLoadedLines = SelectedGridTexts();
+  mvLoadedLines = editor::GridRowTexts(FGSelectedLabour);
 }
 
 void frmLabour::LayoutCatalogueGrid(int index) {
@@ -329,51 +329,15 @@ void frmLabour::cmdClose_Click() {
   Unload();
 }
 
-std::vector<std::string> frmLabour::SelectedGridTexts() const {
-  const grid::FlexGrid& g = FGSelectedLabour;
-  std::vector<std::string> rows;
-  rows.reserve(static_cast<size_t>(g.Rows()));
-  for (int r = 1; r < g.Rows(); ++r) {
-    std::string row;
-    for (int c = 0; c < g.Cols(); ++c) {
-      if (c) row += '\t';
-      row += g.TextView(r, c);
-    }
-    rows.push_back(std::move(row));
-  }
-  return rows;
-}
-
-bool frmLabour::LinesEdited() const {
-  if (mrsDeletedItems && mrsDeletedItems->State() == data::adStateOpen &&
-      mrsDeletedItems->RecordCount() > 0)
-    return true;
-  return SelectedGridTexts() != mvLoadedLines;
-}
-
 void frmLabour::Form_QueryUnload(int& cancel, int unloadMode) {
   // Only Close writes back. Closing the window any other way with edits in
   // hand asks first, so the estimator never loses them without a word.
   if (unloadMode == forms::kFormCode || meMode != eEdit || !Visible()) return;
   if (T1.Visible()) CommitCellText();
-  if (!LinesEdited()) return;
-  // "No" is the default button: a session ended without an answer closes
-  // as the window's close box always did, without writing.
-  const int answer = forms::MsgBox("Save the changes to this quote's labour lines?",
-                                   forms::msgbox::kYesNoCancel | forms::msgbox::kQuestion |
-                                       forms::msgbox::kDefaultButton2,
-                                   "Labour");
-  if (answer == forms::msgbox::kCancel) {
-    cancel = 1;
-  } else if (answer == forms::msgbox::kYes) {
-    // A refused write-back keeps the editor open, and its message says why.
-    try {
-      WriteSelectedItems();
-    } catch (...) {
-      cancel = 1;
-      throw;
-    }
-  }
+  if (!editor::LinesChanged(FGSelectedLabour, mvLoadedLines, mrsDeletedItems.get())) return;
+  editor::AskBeforeDiscarding(
+      "Save the changes to this quote's labour lines?", "Labour", [this] { WriteSelectedItems(); },
+      cancel);
 }
 
 void frmLabour::Form_Unload(int& /*cancel*/) {

@@ -129,13 +129,10 @@ private:
   void EnableEditControls(bool enabled);
   void cmdClose_Click();
   void cmdSearch_Click(int index);
-  // The diagram group search (the "Search" picture button): the diagram
-  // window picks a panel group, the parts of that group become the results.
-  // The diagram window is not part of this editor yet; the button does
-  // nothing until it is connected here.
+  // The diagram group search (the "Search" picture button, catalogue.cpp):
+  // the diagram window picks a panel group, and the available parts of that
+  // group become the results.
   void SearchByDiagramGroup();
-  std::vector<std::string> SelectedGridTexts() const;
-  bool PartsEdited() const;
 
   // ---- store (store.cpp) ----
   void LoadSelectedParts();

@@ -257,7 +257,7 @@ void frmParts::Form_Load() {
   EnableEditControls(meMode != eView);
   forms::Screen.MousePointer(forms::kPointerDefault);
   // What the close box compares with.
-  mvLoadedParts = SelectedGridTexts();
+  mvLoadedParts = editor::GridRowTexts(FGSelectedParts);
 }
 
 void frmParts::LayoutPartsGrid() { editor::ApplyLayout(FGParts, kPartsColumns); }
@@ -292,51 +292,14 @@ void frmParts::cmdSearch_Click(int index) {
     BrowseAvailableParts();
 }
 
-std::vector<std::string> frmParts::SelectedGridTexts() const {
-  const grid::FlexGrid& g = FGSelectedParts;
-  std::vector<std::string> rows;
-  rows.reserve(static_cast<size_t>(g.Rows()));
-  for (int r = 1; r < g.Rows(); ++r) {
-    std::string row;
-    for (int c = 0; c < g.Cols(); ++c) {
-      if (c) row += '\t';
-      row += g.TextView(r, c);
-    }
-    rows.push_back(std::move(row));
-  }
-  return rows;
-}
-
-bool frmParts::PartsEdited() const {
-  if (mrsDeletedItems && mrsDeletedItems->State() == data::adStateOpen &&
-      mrsDeletedItems->RecordCount() > 0)
-    return true;
-  return SelectedGridTexts() != mvLoadedParts;
-}
-
 void frmParts::Form_QueryUnload(int& cancel, int unloadMode) {
   // Only Close writes back. Closing the window any other way with edits in
   // hand asks first, so the estimator never loses them without a word.
   if (unloadMode == forms::kFormCode || meMode != eEdit || !Visible()) return;
   if (T1.Visible()) FGSelectedParts_LeaveCell();
-  if (!PartsEdited()) return;
-  // "No" is the default button: a session ended without an answer closes
-  // as the window's close box always did, without writing.
-  const int answer = forms::MsgBox("Save the changes to this quote's parts?",
-                                   forms::msgbox::kYesNoCancel | forms::msgbox::kQuestion |
-                                       forms::msgbox::kDefaultButton2,
-                                   "Parts");
-  if (answer == forms::msgbox::kCancel) {
-    cancel = 1;
-  } else if (answer == forms::msgbox::kYes) {
-    // A refused write-back keeps the editor open, and its message says why.
-    try {
-      WriteSelectedParts();
-    } catch (...) {
-      cancel = 1;
-      throw;
-    }
-  }
+  if (!editor::LinesChanged(FGSelectedParts, mvLoadedParts, mrsDeletedItems.get())) return;
+  editor::AskBeforeDiscarding(
+      "Save the changes to this quote's parts?", "Parts", [this] { WriteSelectedParts(); }, cancel);
 }
 
 void frmParts::Form_Unload(int& /*cancel*/) {
