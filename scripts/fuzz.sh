@@ -16,7 +16,7 @@ SECONDS_PER_TARGET=${1:-30}
 shift || true
 BUILD_FUZZ=${BUILD_FUZZ:-build-fuzz}
 FUZZ_MAX_LEN=${FUZZ_MAX_LEN:-8192}
-ALL_TARGETS=(criteria number field_cipher text_cp1252 csv csv_import key_file)
+ALL_TARGETS=(criteria number field_cipher text_cp1252 csv csv_import key_file settings)
 TARGETS=("$@")
 [ ${#TARGETS[@]} -eq 0 ] && TARGETS=("${ALL_TARGETS[@]}")
 
