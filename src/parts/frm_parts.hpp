@@ -17,6 +17,7 @@
 //   part_types.cpp  the part-type list and its drop-down button, Delete
 
 #include "data/recordset.hpp"
+#include "editor/deletion_history.hpp"
 #include "editor/flag_glyphs.hpp"
 #include "forms/controls.hpp"
 #include "forms/form.hpp"
@@ -69,6 +70,16 @@ inline constexpr const char* kPartTypeItems[kPartTypeCount] = {
     "New(Space)", "Used(U)", "eXchange(X)", "reCore(C)", "After Market(A)"};
 inline constexpr const char* kPartTypeLetters[kPartTypeCount] = {"", "U", "X", "C", "A"};
 
+// The money of the selected parts while they are edited: the parts at
+// cost (quantity times unit price), with markup (quantity times the price
+// with markup) and the margin between them. Report-only parts are not
+// charged.
+struct PartsTotals {
+  double cost = 0;
+  double sell = 0;
+  double Margin() const { return sell - cost; }
+};
+
 class frmParts : public forms::Form {
 public:
   // ---- controls ----
@@ -103,6 +114,10 @@ public:
                   double pdOldAfterMarketMarkup, EQuoteEditMode peMode);
   // Edit mode: writes the selected grid into the record set.
   void SaveChanges();
+  // The selected parts' totals as the grid stands now, and as the line the
+  // desktop shows under the window.
+  PartsTotals Totals() const;
+  std::string RunningTotals() const override;
   // Edit mode: reloads the selected grid from the record set.
   void UpdateChanges();
 
@@ -184,6 +199,10 @@ private:
   void LV1_KeyPress(int& keyAscii);
   void CommitPartType();
   void cmdDelete_Click();
+  // Deletes the current part; returns it as it stood, for taking it back.
+  editor::DeletedRow DeleteCurrentPart();
+  void UndoDeletion(); // Ctrl+Z
+  void RedoDeletion(); // Ctrl+Y
   void cmdDelete_GotFocus();
 
   // ---- session fields ----
@@ -196,6 +215,7 @@ private:
   std::unique_ptr<data::Recordset> mrsDeletedItems;
   bool mbCellEdited = false;
   std::vector<std::string> mvLoadedParts; // the selected grid as loaded
+  editor::DeletionHistory mHistory;       // this session's deletions
 };
 
 // The list item (1 to 5) of a part-type letter as the cell holds it; 0 for

@@ -4,6 +4,7 @@
 // button, which removes a part and remembers its stored record for the
 // writer.
 
+#include "editor/deletion_history.hpp"
 #include "editor/grid_layout.hpp"
 #include "editor/quote_items.hpp"
 #include "forms/keys.hpp"
@@ -103,14 +104,20 @@ void frmParts::LV1_KeyPress(int& keyAscii) {
 }
 
 void frmParts::cmdDelete_Click() {
+  if (meMode != eEdit || !mrsDeletedItems || FGSelectedParts.Row() < 1) return;
+  mHistory.Deleted(DeleteCurrentPart());
+}
+
+editor::DeletedRow frmParts::DeleteCurrentPart() {
   grid::FlexGrid& g = FGSelectedParts;
-  if (meMode != eEdit || !mrsDeletedItems) return;
   const int r = g.Row();
-  if (r < 1) return;
   // The writer deletes the stored record of a removed part.
   const std::string id = g.TextMatrix(r, sel::kItemId);
   if (!id.empty()) editor::AddRemovedItem(*mrsDeletedItems, id);
-  if (r > 1 || g.Rows() > 2) {
+  const bool onlyPart = !(r > 1 || g.Rows() > 2);
+  editor::DeletedRow deleted = editor::SnapshotRow(
+      g, r, id.empty() ? std::vector<std::string>{} : std::vector{id}, onlyPart);
+  if (!onlyPart) {
     g.RemoveItem(r);
     // Left with exactly eleven rows (ten parts), the description takes back
     // the scroll bar's room, as the labour editor's delete does.
@@ -126,6 +133,28 @@ void frmParts::cmdDelete_Click() {
   // one Escape restores, its tool tip and highlight, as on entering it.
   FGSelectedParts_EnterCell();
   if (FGSelectedParts.CanTakeFocus()) FGSelectedParts.SetFocus();
+  return deleted;
+}
+
+void frmParts::UndoDeletion() {
+  if (!mHistory.CanUndo() || !mrsDeletedItems) return;
+  grid::FlexGrid& g = FGSelectedParts;
+  T1.Visible(false);
+  const editor::DeletedRow part = mHistory.Undo();
+  editor::RestoreRow(g, part);
+  if (!part.blanked && g.Rows() == 12)
+    g.ColWidth(sel::kDescription, g.ColWidth(sel::kDescription) - editor::kRowStepTwips);
+  editor::ForgetRemovedItems(*mrsDeletedItems, part.ids);
+  g.SetCurrentCell(part.row, sel::kItemNo);
+  FGSelectedParts_EnterCell();
+}
+
+void frmParts::RedoDeletion() {
+  if (!mHistory.CanRedo() || !mrsDeletedItems) return;
+  T1.Visible(false);
+  const editor::DeletedRow part = mHistory.Redo();
+  FGSelectedParts.SetCurrentCell(part.row, sel::kItemNo);
+  mHistory.Redone(DeleteCurrentPart());
 }
 
 void frmParts::cmdDelete_GotFocus() { T1.Visible(false); }

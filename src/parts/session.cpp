@@ -228,6 +228,7 @@ void frmParts::SetQuoteNo(data::RecordsetPtr& prsParts, const std::string& psQtn
 void frmParts::Form_Load() {
   mrsDeletedItems.reset(); // a list of this session's only, in edit mode only
   mvLoadedParts.clear();
+  mHistory.Clear();
   mbCellEdited = false;
   forms::Screen.MousePointer(forms::kPointerHourglass);
   cipher::InitFieldCipher();

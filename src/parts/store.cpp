@@ -115,6 +115,27 @@ double StoredMarkup(double unitcost, double price) {
 
 } // namespace
 
+PartsTotals frmParts::Totals() const {
+  PartsTotals totals;
+  const grid::FlexGrid& g = FGSelectedParts;
+  for (int r = 1; r < g.Rows(); ++r) {
+    if (text::Trim(g.TextView(r, col::sel::kDescription)).empty()) continue;
+    if (g.TextView(r, col::sel::kReport) == kTicked) continue;
+    const double qty = text::ParseNumber(g.TextView(r, col::sel::kQty)).value_or(0);
+    totals.cost += qty * text::ParseNumber(g.TextView(r, col::sel::kUnitPrice)).value_or(0);
+    totals.sell += qty * text::ParseNumber(g.TextView(r, col::sel::kMarkup)).value_or(0);
+  }
+  return totals;
+}
+
+std::string frmParts::RunningTotals() const {
+  if (!Loaded()) return {};
+  const PartsTotals t = Totals();
+  auto money = [](double v) { return text::FormatNumber(v, text::kHours); };
+  return "Parts at cost " + money(t.cost) + "    With markup " + money(t.sell) + "    Margin " +
+         money(t.Margin());
+}
+
 void frmParts::SaveChanges() {
   if (meMode == eEdit) WriteSelectedParts();
 }
