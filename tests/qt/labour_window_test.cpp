@@ -5,6 +5,7 @@
 #include "../labour/labour_fixture.hpp"
 #include "qt/grid_view.hpp"
 #include "qt/qt_runtime.hpp"
+#include "qt_fixture.hpp"
 
 #include <QApplication>
 #include <QLabel>
@@ -23,7 +24,7 @@ namespace col = belvane::labour::col;
 
 namespace {
 
-class LabourWindowTest : public test::LabourFixture {
+class LabourWindowTest : public test::LabourFixture, protected qt::testing::RealInput {
 protected:
   void SetUp() override {
     LabourFixture::SetUp();
@@ -55,42 +56,11 @@ protected:
   }
 
   QtRuntime& Qt() { return *qt_; }
-  GridView* Grid(const forms::FlexGrid& g) { return dynamic_cast<GridView*>(qt_->View(g)); }
+  QtRuntime& InputRuntime() override { return *qt_; }
   QString Shown(const forms::FlexGrid& g, int row, int col) {
-    return Grid(g)->Table()->model()->index(row - 1, col).data().toString();
+    return GridOf(g)->Table()->model()->index(row - 1, col).data().toString();
   }
 
-  static void Key(Qt::Key key, Qt::KeyboardModifiers modifiers = Qt::NoModifier) {
-    QWidget* focused = QApplication::focusWidget();
-    ASSERT_NE(focused, nullptr);
-    QTest::keyClick(focused, key, modifiers);
-  }
-  static void Type(const QString& text) {
-    for (const QChar c : text) {
-      QWidget* focused = QApplication::focusWidget();
-      ASSERT_NE(focused, nullptr);
-      QTest::keyClick(focused, c.toLatin1());
-    }
-  }
-  void Click(const forms::Control& control) {
-    QTest::mouseClick(qt_->Widget(control), Qt::LeftButton);
-  }
-  QPoint Centre(const forms::FlexGrid& g, int row, int col) {
-    GridView* view = Grid(g);
-    const QRect cell = view->CellRect(row, col);
-    EXPECT_TRUE(cell.isValid()) << row << "," << col;
-    return view->Table()->viewport()->mapFrom(view->Widget(), cell.center());
-  }
-  void ClickCell(const forms::FlexGrid& g, int row, int col) {
-    QTest::mouseClick(Grid(g)->Table()->viewport(), Qt::LeftButton, {}, Centre(g, row, col));
-  }
-  void DoubleClickCell(const forms::FlexGrid& g, int row, int col) {
-    QWidget* cells = Grid(g)->Table()->viewport();
-    const QPoint at = Centre(g, row, col);
-    QTest::mouseClick(cells, Qt::LeftButton, {}, at);
-    QTest::mouseDClick(cells, Qt::LeftButton, {}, at);
-    QTest::mouseRelease(cells, Qt::LeftButton, {}, at);
-  }
   QLineEdit* Editor(const labour::frmLabour& form) {
     return qobject_cast<QLineEdit*>(qt_->Widget(form.T1));
   }
@@ -129,9 +99,9 @@ TEST_F(LabourWindowTest, AnEstimatorEditsTheQuoteWithKeysAndClicks) {
     EXPECT_TRUE(editor->hasFocus());
     EXPECT_EQ(sel.Row(), 3);
     EXPECT_EQ(sel.Col(), col::kRRHours);
-    const QRect cell = Grid(sel)->CellRect(3, col::kRRHours);
+    const QRect cell = GridOf(sel)->CellRect(3, col::kRRHours);
     EXPECT_EQ(QRect(editor->mapTo(editor->window(), QPoint(0, 0)), editor->size()),
-              QRect(Grid(sel)->Widget()->mapTo(editor->window(), cell.topLeft()), cell.size()));
+              QRect(GridOf(sel)->Widget()->mapTo(editor->window(), cell.topLeft()), cell.size()));
     EXPECT_EQ(editor->selectedText(), "1.50");
     Type("2.5");
     Key(Qt::Key_Return); // formatted, on to the report-only flag
@@ -140,11 +110,11 @@ TEST_F(LabourWindowTest, AnEstimatorEditsTheQuoteWithKeysAndClicks) {
     EXPECT_EQ(sel.Col(), col::kRRReport);
 
     // The space bar ticks the flag: the cell shows a ticked box.
-    QAbstractItemModel* cells = Grid(sel)->Table()->model();
+    QAbstractItemModel* cells = GridOf(sel)->Table()->model();
     EXPECT_EQ(cells->index(2, col::kRRReport).data(Qt::CheckStateRole), Qt::Unchecked);
     Key(Qt::Key_Space);
     EXPECT_EQ(cells->index(2, col::kRRReport).data(Qt::CheckStateRole), Qt::Checked);
-    EXPECT_EQ(Grid(sel)->Widget()->toolTip(), "RR Report Only: Yes");
+    EXPECT_EQ(GridOf(sel)->Widget()->toolTip(), "RR Report Only: Yes");
 
     // The arrows at the edges of the editor's text move between cells.
     DoubleClickCell(sel, 2, col::kDescription); // the description: caret at its end
@@ -271,7 +241,7 @@ TEST_F(LabourWindowTest, TheTotalsStripFollowsTypedHours) {
     EXPECT_TRUE(strip->text().startsWith("R&R 4.00 h  220.00")) << strip->text().toStdString();
     // The strip lies under the design area, which keeps its size.
     EXPECT_EQ(strip->y(),
-              Grid(form.FGSelectedLabour)->Widget()->window()->height() - strip->height());
+              GridOf(form.FGSelectedLabour)->Widget()->window()->height() - strip->height());
     Key(Qt::Key_Return);
     Click(form.cmdClose);
   });

@@ -11,6 +11,7 @@
 #include "qt/grid_view.hpp"
 #include "qt/list_view.hpp"
 #include "qt/qt_runtime.hpp"
+#include "qt_fixture.hpp"
 
 #include <QAbstractItemModel>
 #include <QApplication>
@@ -35,7 +36,7 @@ namespace sel = parts::col::sel;
 
 namespace {
 
-class PartsWindowTest : public test::PartsFixture {
+class PartsWindowTest : public test::PartsFixture, protected qt::testing::RealInput {
 protected:
   void SetUp() override {
     PartsFixture::SetUp();
@@ -74,46 +75,15 @@ protected:
   }
 
   QtRuntime& Qt() { return *qt_; }
-  GridView* Grid(const forms::FlexGrid& g) { return dynamic_cast<GridView*>(qt_->View(g)); }
+  QtRuntime& InputRuntime() override { return *qt_; }
   QString Shown(const forms::FlexGrid& g, int row, int col) {
-    return Grid(g)->Table()->model()->index(row - 1, col).data().toString();
+    return GridOf(g)->Table()->model()->index(row - 1, col).data().toString();
   }
   QLineEdit* Editor(const frmParts& form) { return qobject_cast<QLineEdit*>(qt_->Widget(form.T1)); }
   QTableView* List(const frmParts& form) {
     return dynamic_cast<ListViewView*>(qt_->View(form.LV1))->Table();
   }
 
-  static void Key(Qt::Key key, Qt::KeyboardModifiers modifiers = Qt::NoModifier) {
-    QWidget* focused = QApplication::focusWidget();
-    ASSERT_NE(focused, nullptr) << "no widget has the keyboard focus";
-    QTest::keyClick(focused, key, modifiers);
-  }
-  static void Type(const QString& text) {
-    for (const QChar c : text) {
-      QWidget* focused = QApplication::focusWidget();
-      ASSERT_NE(focused, nullptr) << "no widget has the keyboard focus";
-      QTest::keyClick(focused, c.toLatin1());
-    }
-  }
-  void Click(const forms::Control& control) {
-    QTest::mouseClick(qt_->Widget(control), Qt::LeftButton);
-  }
-  QPoint Centre(const forms::FlexGrid& g, int row, int col) {
-    GridView* view = Grid(g);
-    const QRect cell = view->CellRect(row, col);
-    EXPECT_TRUE(cell.isValid()) << row << "," << col;
-    return view->Table()->viewport()->mapFrom(view->Widget(), cell.center());
-  }
-  void ClickCell(const forms::FlexGrid& g, int row, int col) {
-    QTest::mouseClick(Grid(g)->Table()->viewport(), Qt::LeftButton, {}, Centre(g, row, col));
-  }
-  void DoubleClickCell(const forms::FlexGrid& g, int row, int col) {
-    QWidget* cells = Grid(g)->Table()->viewport();
-    const QPoint at = Centre(g, row, col);
-    QTest::mouseClick(cells, Qt::LeftButton, {}, at);
-    QTest::mouseDClick(cells, Qt::LeftButton, {}, at);
-    QTest::mouseRelease(cells, Qt::LeftButton, {}, at);
-  }
   // A click on the list's item (1 to 5) where the list draws it.
   void ClickItem(const frmParts& form, int item) {
     QTableView* list = List(form);
@@ -127,7 +97,7 @@ protected:
     return QRect(w->mapTo(w->window(), QPoint(0, 0)), w->size());
   }
   QRect CellInWindow(const forms::FlexGrid& g, int row, int col) {
-    GridView* view = Grid(g);
+    GridView* view = GridOf(g);
     const QRect cell = view->CellRect(row, col);
     return QRect(view->Widget()->mapTo(view->Widget()->window(), cell.topLeft()), cell.size());
   }
@@ -254,11 +224,11 @@ TEST_F(PartsWindowTest, AnEstimatorAddsAnExchangePartWithKeysAndClicks) {
 
     // The space bar ticks "Rpt".
     ClickCell(g, 3, sel::kReport);
-    QAbstractItemModel* cells = Grid(g)->Table()->model();
+    QAbstractItemModel* cells = GridOf(g)->Table()->model();
     EXPECT_EQ(cells->index(2, sel::kReport).data(Qt::CheckStateRole), Qt::Unchecked);
     Key(Qt::Key_Space);
     EXPECT_EQ(cells->index(2, sel::kReport).data(Qt::CheckStateRole), Qt::Checked);
-    EXPECT_EQ(Grid(g)->Widget()->toolTip(), "Report Only: Yes");
+    EXPECT_EQ(GridOf(g)->Widget()->toolTip(), "Report Only: Yes");
 
     // Delete the stored front bumper.
     ClickCell(g, 1, sel::kItemNo);

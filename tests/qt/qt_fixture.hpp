@@ -21,35 +21,15 @@
 
 namespace belvane::qt::testing {
 
-class QtFormsTest : public ::testing::Test {
+// Real input on the real widgets of a runtime's windows: QTest events sent
+// where a person's would go. A fixture mixes it in and names its runtime.
+class RealInput {
 protected:
-  void SetUp() override {
-    QtRuntime::Application();
-    runtime_ = std::make_unique<QtRuntime>();
-    runtime_->ShowHandlerErrors(false);
-    use_.emplace(*runtime_);
-  }
-  void TearDown() override {
-    use_.reset();
-    runtime_.reset();
-  }
+  virtual ~RealInput() = default;
+  virtual QtRuntime& InputRuntime() = 0;
 
-  QtRuntime& Runtime() { return *runtime_; }
-
-  // Shows a form modally; `user` plays the user once its window is active.
-  void RunModal(forms::Form& form, const std::function<void()>& user) {
-    runtime_->QueueModal([this, &form, user](forms::Form&) {
-      QWidget* window = runtime_->Window(form);
-      ASSERT_NE(window, nullptr);
-      ASSERT_TRUE(QTest::qWaitForWindowActive(window));
-      user();
-    });
-    form.Show(forms::ShowStyle::Modal);
-  }
-
-  QWidget* WidgetOf(const forms::Control& control) { return runtime_->Widget(control); }
   GridView* GridOf(const forms::FlexGrid& grid) {
-    return dynamic_cast<GridView*>(runtime_->View(grid));
+    return dynamic_cast<GridView*>(InputRuntime().View(grid));
   }
 
   // Keys go to whatever widget Qt gives the keyboard, as a person's do.
@@ -88,8 +68,38 @@ protected:
     QTest::mouseRelease(cells, Qt::LeftButton, {}, at);
   }
   void Click(const forms::Control& control) {
-    QTest::mouseClick(WidgetOf(control), Qt::LeftButton);
+    QTest::mouseClick(InputRuntime().Widget(control), Qt::LeftButton);
   }
+};
+
+class QtFormsTest : public ::testing::Test, protected RealInput {
+protected:
+  void SetUp() override {
+    QtRuntime::Application();
+    runtime_ = std::make_unique<QtRuntime>();
+    runtime_->ShowHandlerErrors(false);
+    use_.emplace(*runtime_);
+  }
+  void TearDown() override {
+    use_.reset();
+    runtime_.reset();
+  }
+
+  QtRuntime& Runtime() { return *runtime_; }
+  QtRuntime& InputRuntime() override { return *runtime_; }
+
+  // Shows a form modally; `user` plays the user once its window is active.
+  void RunModal(forms::Form& form, const std::function<void()>& user) {
+    runtime_->QueueModal([this, &form, user](forms::Form&) {
+      QWidget* window = runtime_->Window(form);
+      ASSERT_NE(window, nullptr);
+      ASSERT_TRUE(QTest::qWaitForWindowActive(window));
+      user();
+    });
+    form.Show(forms::ShowStyle::Modal);
+  }
+
+  QWidget* WidgetOf(const forms::Control& control) { return runtime_->Widget(control); }
 
   // The pixel rectangle of a widget, or of a grid cell, in its window.
   static QRect InWindow(const QWidget* widget, QRect rect) {
