@@ -59,6 +59,13 @@ public:
   bool TabStop() const noexcept { return tabStop_; }
   void TabStop(bool tabStop);
 
+  // The letter that works the control from the keyboard with Alt (0 for
+  // none): the one the form gave, else the letter marked with "&" in the
+  // caption. An upper-case letter or a digit. Part of the form's make: it
+  // survives unloading.
+  char32_t AccessKey() const;
+  void AccessKey(char32_t key);
+
   // Gives the control the focus: LostFocus on the control that had it, then
   // GotFocus here. Nothing happens when it has the focus already. Raises
   // error 5 when the control cannot take the focus (a label or frame, a
@@ -122,6 +129,7 @@ private:
   Frame* container_ = nullptr;
   int tabIndex_;
   bool tabStop_ = true;
+  char32_t accessKey_ = 0;
 };
 
 // Joins a model to Control. Concrete controls derive from ControlOf<Model>.

@@ -8,6 +8,12 @@
 //                   comes back exactly as designed.
 //   Form_Load()     after Design, when the form loads.
 //   Form_Activate() each time the form becomes the active window.
+//   Form_KeyDown(keyCode, shift)
+//                   with KeyPreview on: each key before the focused
+//                   control sees it; setting keyCode to 0 consumes it.
+//   Form_Resize()   after the user resized a sizable window (Sizable):
+//                   the client size (ScaleWidth, ScaleHeight) is the new
+//                   one and the form lays its controls out for it.
 //   Form_QueryUnload(cancel, mode), Form_Unload(cancel)
 //                   before unloading; a non-zero cancel keeps the form.
 //
@@ -82,6 +88,14 @@ public:
   void ScaleWidth(int width);
   void ScaleHeight(int height);
 
+  // Whether the user may resize and maximise the window. Part of the form's
+  // make, like its controls' handlers: it survives unloading.
+  bool Sizable() const noexcept { return sizable_; }
+  void Sizable(bool sizable) { sizable_ = sizable; }
+  // Whether Form_KeyDown sees every key first. Part of the form's make.
+  bool KeyPreview() const noexcept { return keyPreview_; }
+  void KeyPreview(bool preview) { keyPreview_ = preview; }
+
   const std::string& FontName() const noexcept { return state_.fontName; }
   void FontName(std::string name);
   double FontSize() const noexcept { return state_.fontSize; }
@@ -109,6 +123,8 @@ protected:
   virtual void Design() {}
   virtual void Form_Load() {}
   virtual void Form_Activate() {}
+  virtual void Form_KeyDown(int& /*keyCode*/, int /*shift*/) {}
+  virtual void Form_Resize() {}
   virtual void Form_QueryUnload(int& /*cancel*/, int /*unloadMode*/) {}
   virtual void Form_Unload(int& /*cancel*/) {}
 
@@ -155,6 +171,8 @@ private:
   bool modal_ = false;
   bool loading_ = false;
   bool unloading_ = false;
+  bool sizable_ = false;
+  bool keyPreview_ = false;
 };
 
 } // namespace belvane::forms

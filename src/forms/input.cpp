@@ -7,7 +7,9 @@
 #include "forms/windows.hpp"
 #include "text/error.hpp"
 
+#include <algorithm>
 #include <string>
+#include <vector>
 
 namespace belvane::forms {
 
@@ -34,6 +36,18 @@ template <class F> void Step(const Control& control, const char* event, F&& step
   }
 }
 
+// The same for a step the form itself takes (its key preview, close box,
+// resizing).
+template <class F> void FormStep(const Form& form, const char* event, F&& step) {
+  try {
+    step();
+  } catch (const Error& e) {
+    CurrentRuntime().UnhandledError(form.Name() + "_" + event, e.Number(), e.Description());
+  } catch (const std::exception& e) {
+    CurrentRuntime().UnhandledError(form.Name() + "_" + event, 0, e.what());
+  }
+}
+
 } // namespace
 
 Form* Input::ActiveForm() {
@@ -57,9 +71,15 @@ bool Input::KeyDown(int keyCode, int shift, char32_t character) {
     }
     return true;
   }
+  if ((shift & kAltMask) != 0 && (shift & kCtrlMask) == 0 && AccessKeyDown(*form, keyCode))
+    return true;
+  int code = keyCode;
+  if (form->KeyPreview()) {
+    FormStep(*form, "KeyDown", [&] { form->Form_KeyDown(code, shift); });
+    if (code == 0) return true;
+  }
   Control* target = form->ActiveControl();
   if (!target || !Accepts(*target)) return false;
-  int code = keyCode;
   Step(*target, "KeyDown", [&] {
     if (target->OnKeyDown) target->OnKeyDown(code, shift);
   });
@@ -72,6 +92,42 @@ bool Input::KeyDown(int keyCode, int shift, char32_t character) {
   });
   if (ascii != 0 && Accepts(*target))
     Step(*target, "KeyPress", [&] { target->DefaultKeyPress(ascii); });
+  return true;
+}
+
+// The control of the form whose access key this is, shown and enabled.
+// Works it as the key says and returns true; false when no control has
+// that key.
+bool Input::AccessKeyDown(Form& form, int keyCode) {
+  if (keyCode <= 0) return false;
+  const auto key = static_cast<char32_t>(keyCode);
+  Control* owner = nullptr;
+  for (Control* c : form.Controls())
+    if (c->AccessKey() == key && c->IsShown() && c->IsEnabled()) {
+      owner = c;
+      break;
+    }
+  if (!owner) return false;
+  const ControlKind kind = owner->Kind();
+  if (kind == ControlKind::Label || kind == ControlKind::Frame) {
+    // The control it names: the next in the tab order that takes the focus.
+    std::vector<Control*> order = form.Controls();
+    std::stable_sort(order.begin(), order.end(), [](const Control* a, const Control* b) {
+      return a->TabIndex() < b->TabIndex();
+    });
+    auto it = std::find(order.begin(), order.end(), owner);
+    for (++it; it != order.end(); ++it) {
+      Control* next = *it;
+      if (!next->TabStop() || !next->CanTakeFocus()) continue;
+      Step(*next, "GotFocus", [&] { form.MoveFocus(next); });
+      if (form.ActiveControl() == next) Step(*next, "GotFocus", [&] { next->TabbedInto(); });
+      break;
+    }
+    return true;
+  }
+  if (owner->CanTakeFocus() && !owner->HasFocus())
+    Step(*owner, "GotFocus", [&] { form.MoveFocus(owner); });
+  if (Accepts(*owner)) Step(*owner, "Click", [&] { owner->UserClick(); });
   return true;
 }
 
@@ -141,13 +197,16 @@ bool Input::ScrollIntoView(FlexGrid& grid, int row, int col) {
 
 bool Input::CloseBox(Form& form) {
   if (!form.AcceptsInput()) return false;
-  try {
-    form.Close(kFormControlMenu);
-  } catch (const Error& e) {
-    CurrentRuntime().UnhandledError(form.Name() + "_Unload", e.Number(), e.Description());
-  } catch (const std::exception& e) {
-    CurrentRuntime().UnhandledError(form.Name() + "_Unload", 0, e.what());
-  }
+  FormStep(form, "Unload", [&] { form.Close(kFormControlMenu); });
+  return true;
+}
+
+bool Input::Resize(Form& form, int scaleWidth, int scaleHeight) {
+  if (!form.Loaded() || !form.Sizable()) return false;
+  form.state_.clientWidth = std::max(0, scaleWidth);
+  form.state_.clientHeight = std::max(0, scaleHeight);
+  form.NotifyProperty(grid::Property::Geometry);
+  FormStep(form, "Resize", [&] { form.Form_Resize(); });
   return true;
 }
 

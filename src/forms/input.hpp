@@ -14,6 +14,11 @@
 //           cell clicked: LeaveCell, EnterCell); on release Click (left
 //           button, released on the control it went down on), MouseUp.
 //           DoubleClick raises DblClick after the click of its first press.
+//   access: Alt and a control's access key (Control::AccessKey) on the
+//           active form, before the focused control sees the key: a button
+//           takes the focus and clicks, a check box toggles, an option
+//           button turns on; a label or frame gives the focus to the next
+//           control in the tab order that takes it.
 //
 // Input is refused (the call returns false) for a control that is hidden or
 // disabled, or in a frame that is, and for a form that is not shown, is
@@ -43,11 +48,18 @@ public:
   static bool ScrollIntoView(FlexGrid& grid, int row, int col);
   // The window's close box.
   static bool CloseBox(Form& form);
+  // The user resized a sizable window to a client area of the given twips:
+  // the form takes the size, then Form_Resize runs. Refused for a form that
+  // is not loaded or not sizable.
+  static bool Resize(Form& form, int scaleWidth, int scaleHeight);
 
   // The form that keyboard input goes to: the topmost shown form.
   static Form* ActiveForm();
   // Whether input to the control would be taken now.
   static bool Accepts(const Control& control);
+
+private:
+  static bool AccessKeyDown(Form& form, int keyCode);
 };
 
 } // namespace belvane::forms

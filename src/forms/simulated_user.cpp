@@ -40,6 +40,7 @@ KeyStroke KeyFor(char32_t c) {
 // The character a key makes, if any.
 char32_t CharacterOf(int keyCode, int shift) {
   const bool ctrl = (shift & kCtrlMask) != 0;
+  if ((shift & kAltMask) != 0) return 0; // Alt combinations type nothing
   switch (keyCode) {
   case keys::kEnter:
   case keys::kEscape:
@@ -142,6 +143,10 @@ bool SimulatedUser::DoubleClickItem(ListView& list, int index) {
 
 bool SimulatedUser::ScrollGrid(FlexGrid& grid, int topRow, int leftCol) {
   return Input::Scroll(grid, topRow, leftCol < 0 ? grid.LeftCol() : leftCol);
+}
+
+bool SimulatedUser::Resize(Form& form, int scaleWidth, int scaleHeight) {
+  return Input::Resize(form, scaleWidth, scaleHeight);
 }
 
 bool SimulatedUser::Close(Form& form) { return Input::CloseBox(form); }

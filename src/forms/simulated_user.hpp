@@ -40,6 +40,8 @@ public:
   bool ScrollGrid(FlexGrid& grid, int topRow, int leftCol = -1);
   // The window's close box.
   bool Close(Form& form);
+  // Drags the window's border to a client area of the given twips.
+  bool Resize(Form& form, int scaleWidth, int scaleHeight);
 
   // Clicks on the page a web browser shows (headless, through the page host,
   // which plays the page's script: page_host.hpp). By element id or name; the

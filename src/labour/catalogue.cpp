@@ -4,6 +4,7 @@
 #include "data/catalogue.hpp"
 #include "cipher/field.hpp"
 #include "editor/grid_layout.hpp"
+#include "forms/keys.hpp"
 #include "forms/runtime.hpp"
 #include "labour/frm_labour.hpp"
 #include "text/number.hpp"
@@ -108,11 +109,10 @@ void frmLabour::FindSearchItemRow(long& row) {
   }
 }
 
-void frmLabour::AddFromSourceGrid(forms::FlexGrid& source,
+void frmLabour::AddFromSourceGrid(forms::FlexGrid& source, int c,
                                   const std::function<void(long&)>& findRow) {
   grid::FlexGrid& sel = FGSelectedLabour;
   const int r = source.Row();
-  const int c = source.Col();
   if (IsGrey(source, r, c)) return;
   auto G = [&](int column) { return source.TextMatrix(r, column); };
 
@@ -243,12 +243,32 @@ void frmLabour::FGLabourItems_Click(int index) {
 void frmLabour::FGLabourItems_GotFocus(int /*index*/) { T1.Visible(false); }
 
 void frmLabour::FGLabourItems_DblClick(int index) {
-  AddFromSourceGrid(FGLabourItems(index),
+  AddFromSourceGrid(FGLabourItems(index), FGLabourItems(index).Col(),
                     [this, index](long& row) { FindCatalogueItemRow(index, row); });
 }
 
 void frmLabour::fgSearch_DblClick() {
-  AddFromSourceGrid(fgSearch, [this](long& row) { FindSearchItemRow(row); });
+  AddFromSourceGrid(fgSearch, fgSearch.Col(), [this](long& row) { FindSearchItemRow(row); });
+}
+
+namespace {
+bool IsAddKey(int keyCode, int shift) {
+  namespace keys = forms::keys;
+  return (keyCode == keys::kEnter || keyCode == keys::kInsert) && shift == 0;
+}
+} // namespace
+
+void frmLabour::FGLabourItems_KeyDown(int index, int& keyCode, int shift) {
+  if (!IsAddKey(keyCode, shift) || FGLabourItems(index).Row() < 1) return;
+  keyCode = 0;
+  AddFromSourceGrid(FGLabourItems(index), col::kDescription,
+                    [this, index](long& row) { FindCatalogueItemRow(index, row); });
+}
+
+void frmLabour::fgSearch_KeyDown(int& keyCode, int shift) {
+  if (!IsAddKey(keyCode, shift) || fgSearch.Row() < 1) return;
+  keyCode = 0;
+  AddFromSourceGrid(fgSearch, col::kDescription, [this](long& row) { FindSearchItemRow(row); });
 }
 
 void frmLabour::txtSearch_KeyPress(int& keyAscii) {

@@ -13,6 +13,7 @@
 #include "data/recordset.hpp"
 #include "editor/deletion_history.hpp"
 #include "editor/flag_glyphs.hpp"
+#include "editor/window_layout.hpp"
 #include "forms/controls.hpp"
 #include "forms/form.hpp"
 #include "host/component_state.hpp"
@@ -114,6 +115,10 @@ public:
 protected:
   void Design() override;
   void Form_Load() override;
+  // F1 anywhere in the window: the key reference.
+  void Form_KeyDown(int& keyCode, int shift) override;
+  // A larger window gives its room to the grids (the descriptions widen).
+  void Form_Resize() override;
   // Closing the window otherwise than by Close asks whether to keep edits.
   void Form_QueryUnload(int& cancel, int unloadMode) override;
   void Form_Unload(int& cancel) override;
@@ -126,6 +131,8 @@ private:
   void EnableEditControls(bool enabled);
   void optSchedule_Click(int index);
   void cmdClose_Click();
+  void cmdHelp_Click();
+  void CaptureWindowLayout();
 
   // ---- store (store.cpp) ----
   void LoadSelectedItems();
@@ -140,13 +147,20 @@ private:
                          const std::string& bodyId, int16_t gridIndex);
   void FindCatalogueItemRow(int gridIndex, long& row);
   void FindSearchItemRow(long& row);
-  void AddFromSourceGrid(forms::FlexGrid& source, const std::function<void(long&)>& findRow);
+  // Adds the source grid's current row as a double click in column `col`
+  // would: the whole item from the number or description, else only the
+  // operation of that column.
+  void AddFromSourceGrid(forms::FlexGrid& source, int col,
+                         const std::function<void(long&)>& findRow);
   void FormatFlagCells(long row);
   void SearchLabourItems();
   void FGLabourItems_Click(int index);
   void FGLabourItems_GotFocus(int index);
   void FGLabourItems_DblClick(int index);
   void fgSearch_DblClick();
+  // Enter or Insert on a row adds the whole item.
+  void FGLabourItems_KeyDown(int index, int& keyCode, int shift);
+  void fgSearch_KeyDown(int& keyCode, int shift);
   void txtSearch_KeyPress(int& keyAscii);
   void txtSearch_GotFocus();
   void txtSearch_LostFocus();
@@ -195,6 +209,7 @@ private:
   std::unique_ptr<data::Recordset> mrsDeletedItems;
   std::vector<std::string> mvLoadedLines; // the selected grid as loaded
   editor::DeletionHistory mHistory;       // this session's deletions
+  editor::WindowLayout mLayout;           // the window's layout for its size
 };
 
 // The thread's labour editor, created on first use and kept.

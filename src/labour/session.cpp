@@ -3,9 +3,12 @@
 // grid layouts, view versus edit mode, closing and unloading.
 
 #include "cipher/field.hpp"
+#include "editor/cell_editor.hpp"
 #include "editor/grid_layout.hpp"
+#include "editor/keys_help.hpp"
 #include "editor/modal_session.hpp"
 #include "editor/quote_items.hpp"
+#include "forms/keys.hpp"
 #include "forms/runtime.hpp"
 #include "host/frm_status.hpp"
 #include "labour/frm_labour.hpp"
@@ -86,18 +89,39 @@ frmLabour::frmLabour() : Form("frmLabour") {
   txtSearch.Container(&Frame1);
   cmdBrowse.Container(&Frame1);
 
+  // The window: sizable, F1 from anywhere, and the access keys (Alt and
+  // the letter) of its buttons, options and the labels of its lists.
+  Sizable(true);
+  KeyPreview(true);
+  Label3.AccessKey('S');
+  cmdBrowse.AccessKey('B');
+  Label1.AccessKey('A');
+  const std::array<char32_t, 4> optionKeys{'N', 'M', '3', 'P'};
+  for (int i = 0; i < 4; ++i)
+    optSchedule(i).AccessKey(optionKeys[static_cast<size_t>(i)]);
+  Label2.AccessKey('E');
+  AutoReturn.AccessKey('R');
+  cmdDelete.AccessKey('D');
+  cmdHelp.AccessKey('H');
+  cmdClose.AccessKey('C');
+
   // Session.
   for (int i = 0; i < 4; ++i)
     optSchedule(i).OnClick = [this, i] { optSchedule_Click(i); };
   cmdClose.OnClick = [this] { cmdClose_Click(); };
+  cmdHelp.OnClick = [this] { cmdHelp_Click(); };
 
   // Catalogue and search.
   for (int i = 0; i < 4; ++i) {
     FGLabourItems(i).OnClick = [this, i] { FGLabourItems_Click(i); };
     FGLabourItems(i).OnGotFocus = [this, i] { FGLabourItems_GotFocus(i); };
     FGLabourItems(i).OnDblClick = [this, i] { FGLabourItems_DblClick(i); };
+    FGLabourItems(i).OnKeyDown = [this, i](int& keyCode, int shift) {
+      FGLabourItems_KeyDown(i, keyCode, shift);
+    };
   }
   fgSearch.OnDblClick = [this] { fgSearch_DblClick(); };
+  fgSearch.OnKeyDown = [this](int& keyCode, int shift) { fgSearch_KeyDown(keyCode, shift); };
   txtSearch.OnKeyPress = [this](int& keyAscii) { txtSearch_KeyPress(keyAscii); };
   txtSearch.OnGotFocus = [this] { txtSearch_GotFocus(); };
   txtSearch.OnLostFocus = [this] { txtSearch_LostFocus(); };
@@ -218,6 +242,7 @@ void frmLabour::SetQuoteNo(data::RecordsetPtr& prsLab, std::string& psSchedType,
 }
 
 void frmLabour::Form_Load() {
+  CaptureWindowLayout();
   try {
     mrsDeletedItems.reset(); // a list of this session's only, in edit mode only
     mvLoadedLines.clear();
@@ -322,6 +347,65 @@ void frmLabour::optSchedule_Click(int index) {
 
   Enabled(true);
   if (index >= 0 && index < FGLabourItems.Count()) FGLabourItems(index).Visible(true);
+}
+
+// ---- the window ----
+
+// The design's layout, shared out as the window grows: the catalogue area
+// takes the larger share of the height, as in the design, the selected lines
+// the rest; every grid widens by its description; the buttons stay at the
+// bottom right corner.
+void frmLabour::CaptureWindowLayout() {
+  const double top = 2925.0 / (2925.0 + 2235.0);
+  std::vector<editor::Stretch> stretches{
+      {&Frame1, 0, 0, 1, 0},
+      {&fgSearch, 0, 0, 1, top},
+      {&lblLoading, 0.5, top / 2, 0, 0},
+      {&Label2, 0, top, 0, 0},
+      {&FGSelectedLabour, 0, top, 1, 1 - top},
+      {&AutoReturn, 0, 1, 0, 0},
+      {&CellIndicator, 0, 1, 0, 0},
+      {&cmdDelete, 1, 1, 0, 0},
+      {&cmdHelp, 1, 1, 0, 0},
+      {&cmdClose, 1, 1, 0, 0},
+  };
+  std::vector<editor::WideningColumn> columns{{&fgSearch, col::kDescription},
+                                              {&FGSelectedLabour, col::kDescription}};
+  for (int i = 0; i < 4; ++i) {
+    stretches.push_back({&FGLabourItems(i), 0, 0, 1, top});
+    stretches.push_back({&optSchedule(i), 0, top, 0, 0});
+    columns.push_back({&FGLabourItems(i), col::kDescription});
+  }
+  mLayout.Capture(*this, std::move(stretches), std::move(columns));
+}
+
+void frmLabour::Form_Resize() {
+  mLayout.Apply(*this);
+  if (T1.Visible()) editor::PlaceOverCurrentCell(T1, FGSelectedLabour);
+}
+
+void frmLabour::Form_KeyDown(int& keyCode, int shift) {
+  if (keyCode != forms::keys::kF1 || shift != 0) return;
+  keyCode = 0;
+  cmdHelp_Click();
+}
+
+void frmLabour::cmdHelp_Click() {
+  editor::ShowKeysHelp(
+      "Labour editor keys",
+      "Finding labour\r\n"
+      "  Alt+S: type words in \"Search for\", then Enter; Browse (Alt+B) shows the schedule "
+      "again.\r\n"
+      "  Alt+N, Alt+M, Alt+3, Alt+P: the NRMA, MTA, 3RD and NRMA CP schedules.\r\n"
+      "  Alt+A: the list of available items; arrows and Page Up/Down move in it.\r\n"
+      "  Enter or Insert, or a double click on the description: adds the whole item.\r\n"
+      "  A double click on an R&R, Repair or Paint figure: adds only that operation.\r\n"
+      "\r\n"
+      "Editing the selected lines (Alt+E)\r\n"
+      "  Arrows move; typing replaces the cell; F2 or a double click edits it.\r\n"
+      "  Enter keeps the text and moves on; Escape takes the cell back.\r\n"
+      "  Space or a double click ticks or clears a flag.\r\n"
+      "  Delete (Alt+D): removes the current line.");
 }
 
 void frmLabour::cmdClose_Click() {

@@ -6,6 +6,7 @@
 #include "cipher/field.hpp"
 #include "diagram/frm_butterfly.hpp"
 #include "editor/grid_layout.hpp"
+#include "forms/keys.hpp"
 #include "forms/runtime.hpp"
 #include "parts/frm_parts.hpp"
 #include "text/error.hpp"
@@ -352,6 +353,13 @@ void frmParts::SearchByDiagramGroup() {
 void frmParts::FGParts_DblClick() { AddPartFrom(FGParts); }
 
 void frmParts::fgSearch_DblClick() { AddPartFrom(fgSearch); }
+
+void frmParts::CatalogueGrid_KeyDown(forms::FlexGrid& source, int& keyCode, int shift) {
+  namespace keys = forms::keys;
+  if ((keyCode != keys::kEnter && keyCode != keys::kInsert) || shift != 0) return;
+  keyCode = 0;
+  AddPartFrom(source);
+}
 
 void frmParts::txtSearch_KeyPress(int& keyAscii) {
   if (keyAscii == 13) SearchParts();

@@ -88,11 +88,8 @@ void frmParts::RepriceRow(int row) {
 
 // ---- the in-cell editor ----
 
-void frmParts::OpenCellEditor(bool selectAll) {
-  if (!T1.Enabled()) return; // view mode
+void frmParts::PlaceCellEditor() {
   grid::FlexGrid& g = FGSelectedParts;
-  const int c = g.Col();
-
   editor::PlaceOverCurrentCell(T1, g);
   // The drop-down button at the editor's right end, as high as the editor.
   CB1.Move(T1.Left() + T1.Width() - CB1.Width(), T1.Top(), CB1.Width(), T1.Height());
@@ -102,11 +99,25 @@ void frmParts::OpenCellEditor(bool selectAll) {
   int listTop = T1.Top() + T1.Height();
   if (listTop + LV1.Height() > ScaleHeight() - 60) listTop = T1.Top() - LV1.Height();
   LV1.Move(T1.Left() + T1.Width() - LV1.Width(), listTop);
+  // In the type column the button stays visible beside the editor.
+  if (g.Col() == sel::kType) T1.Width(T1.Width() - CB1.Width());
+}
 
+void frmParts::PlaceTypeButton() {
+  grid::FlexGrid& g = FGSelectedParts;
+  CB1.Move(g.Left() + g.CellLeft() + g.CellWidth() - CB1.Width(), g.Top() + g.CellTop(),
+           CB1.Width(), g.CellHeight());
+}
+
+void frmParts::OpenCellEditor(bool selectAll) {
+  if (!T1.Enabled()) return; // view mode
+  grid::FlexGrid& g = FGSelectedParts;
+  const int c = g.Col();
+
+  PlaceCellEditor();
   T1.Visible(true);
   if (c == sel::kType) {
     T1.MaxLength(1);
-    T1.Width(T1.Width() - CB1.Width()); // the button stays visible beside it
     CB1.Visible(true);
   } else {
     T1.MaxLength(0);
@@ -218,9 +229,7 @@ void frmParts::FGSelectedParts_EnterCell() {
   }
   if (c == sel::kType) {
     g.CellAlignment(grid::kAlignLeftCenter);
-    const int height = g.CellHeight();
-    CB1.Move(g.Left() + g.CellLeft() + g.CellWidth() - CB1.Width(), g.Top() + g.CellTop(),
-             CB1.Width(), height);
+    PlaceTypeButton();
     CB1.Visible(true);
   }
   if (FGSelectedParts.CanTakeFocus()) FGSelectedParts.SetFocus();

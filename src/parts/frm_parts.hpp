@@ -19,6 +19,7 @@
 #include "data/recordset.hpp"
 #include "editor/deletion_history.hpp"
 #include "editor/flag_glyphs.hpp"
+#include "editor/window_layout.hpp"
 #include "forms/controls.hpp"
 #include "forms/form.hpp"
 #include "host/component_state.hpp"
@@ -129,6 +130,10 @@ public:
 protected:
   void Design() override;
   void Form_Load() override;
+  // F1 anywhere in the window: the key reference.
+  void Form_KeyDown(int& keyCode, int shift) override;
+  // A larger window gives its room to the grids (the descriptions widen).
+  void Form_Resize() override;
   // Closing the window otherwise than by Close asks whether to keep edits.
   void Form_QueryUnload(int& cancel, int unloadMode) override;
   void Form_Unload(int& cancel) override;
@@ -143,6 +148,8 @@ private:
   void LayoutSelectedGrid();
   void EnableEditControls(bool enabled);
   void cmdClose_Click();
+  void cmdHelp_Click();
+  void CaptureWindowLayout();
   void cmdSearch_Click(int index);
   // The diagram group search (the "Search" picture button, catalogue.cpp):
   // the diagram window picks a panel group, and the available parts of that
@@ -167,6 +174,8 @@ private:
   bool ShowSearchResults();
   void FGParts_DblClick();
   void fgSearch_DblClick();
+  // Enter or Insert on a row adds the part, as a double click does.
+  void CatalogueGrid_KeyDown(forms::FlexGrid& source, int& keyCode, int shift);
   void txtSearch_KeyPress(int& keyAscii);
   void txtSearch_GotFocus();
   void txtSearch_LostFocus();
@@ -174,6 +183,10 @@ private:
 
   // ---- editing (editing.cpp) ----
   void OpenCellEditor(bool selectAll);
+  // Lays the editor, its drop-down button and list over the current cell.
+  void PlaceCellEditor();
+  // The drop-down button at the right end of the current type cell.
+  void PlaceTypeButton();
   void MoveToNextCell();
   void RepriceRow(int row);
   // The current markup percentage of a part-type letter.
@@ -216,6 +229,7 @@ private:
   bool mbCellEdited = false;
   std::vector<std::string> mvLoadedParts; // the selected grid as loaded
   editor::DeletionHistory mHistory;       // this session's deletions
+  editor::WindowLayout mLayout;           // the window's layout for its size
 };
 
 // The list item (1 to 5) of a part-type letter as the cell holds it; 0 for

@@ -6,8 +6,10 @@
 #include "data/catalogue.hpp"
 #include "diagram/frm_butterfly.hpp"
 #include "editor/grid_layout.hpp"
+#include "editor/keys_help.hpp"
 #include "editor/modal_session.hpp"
 #include "editor/quote_items.hpp"
+#include "forms/keys.hpp"
 #include "forms/runtime.hpp"
 #include "parts/frm_parts.hpp"
 #include "text/error.hpp"
@@ -84,14 +86,34 @@ frmParts::frmParts() : Form("frmParts") {
   cmdSearch(0).Container(&Frame1);
   cmdSearch(1).Container(&Frame1);
 
+  // The window: sizable, F1 from anywhere, and the access keys (Alt and
+  // the letter) of its buttons and the labels of its lists.
+  Sizable(true);
+  KeyPreview(true);
+  Label3.AccessKey('S');
+  cmdSearch(0).AccessKey('G');
+  cmdSearch(1).AccessKey('B');
+  Label1.AccessKey('A');
+  Label2.AccessKey('E');
+  cmdDelete.AccessKey('D');
+  cmdHelp.AccessKey('H');
+  cmdClose.AccessKey('C');
+
   // Session.
   cmdClose.OnClick = [this] { cmdClose_Click(); };
+  cmdHelp.OnClick = [this] { cmdHelp_Click(); };
   for (int i = 0; i < cmdSearch.Count(); ++i)
     cmdSearch(i).OnClick = [this, i] { cmdSearch_Click(i); };
 
   // Catalogue and search.
   FGParts.OnDblClick = [this] { FGParts_DblClick(); };
   fgSearch.OnDblClick = [this] { fgSearch_DblClick(); };
+  FGParts.OnKeyDown = [this](int& keyCode, int shift) {
+    CatalogueGrid_KeyDown(FGParts, keyCode, shift);
+  };
+  fgSearch.OnKeyDown = [this](int& keyCode, int shift) {
+    CatalogueGrid_KeyDown(fgSearch, keyCode, shift);
+  };
   txtSearch.OnKeyPress = [this](int& keyAscii) { txtSearch_KeyPress(keyAscii); };
   txtSearch.OnGotFocus = [this] { txtSearch_GotFocus(); };
   txtSearch.OnLostFocus = [this] { txtSearch_LostFocus(); };
@@ -226,6 +248,7 @@ void frmParts::SetQuoteNo(data::RecordsetPtr& prsParts, const std::string& psQtn
 }
 
 void frmParts::Form_Load() {
+  CaptureWindowLayout();
   mrsDeletedItems.reset(); // a list of this session's only, in edit mode only
   mvLoadedParts.clear();
   mHistory.Clear();
@@ -275,6 +298,62 @@ void frmParts::EnableEditControls(bool enabled) {
   CB1.Enabled(enabled);
   cmdDelete.Enabled(enabled);
   cmdSearch(0).Enabled(enabled);
+}
+
+// ---- the window ----
+
+// The design's layout, shared out as the window grows: the catalogue area
+// takes the larger share of the height, as in the design, the selected parts
+// the rest; every grid widens by its description; the buttons stay at the
+// bottom right corner.
+void frmParts::CaptureWindowLayout() {
+  const double top = 2925.0 / (2925.0 + 2235.0);
+  mLayout.Capture(*this,
+                  {
+                      {&Frame1, 0, 0, 1, 0},
+                      {&FGParts, 0, 0, 1, top},
+                      {&fgSearch, 0, 0, 1, top},
+                      {&Label2, 0, top, 0, 0},
+                      {&FGSelectedParts, 0, top, 1, 1 - top},
+                      {&cmdDelete, 1, 1, 0, 0},
+                      {&cmdHelp, 1, 1, 0, 0},
+                      {&cmdClose, 1, 1, 0, 0},
+                  },
+                  {{&FGParts, col::cat::kDescription},
+                   {&fgSearch, col::cat::kDescription},
+                   {&FGSelectedParts, col::sel::kDescription}});
+}
+
+void frmParts::Form_Resize() {
+  mLayout.Apply(*this);
+  if (T1.Visible())
+    PlaceCellEditor();
+  else if (CB1.Visible())
+    PlaceTypeButton();
+}
+
+void frmParts::Form_KeyDown(int& keyCode, int shift) {
+  if (keyCode != forms::keys::kF1 || shift != 0) return;
+  keyCode = 0;
+  cmdHelp_Click();
+}
+
+void frmParts::cmdHelp_Click() {
+  editor::ShowKeysHelp(
+      "Parts editor keys",
+      "Finding parts\r\n"
+      "  Alt+S: type words in \"Search for\", then Enter.\r\n"
+      "  Alt+G: find the parts of a panel group on the vehicle diagram.\r\n"
+      "  Alt+B: browse every available part again.\r\n"
+      "  Alt+A: the list of available parts; arrows and Page Up/Down move in it.\r\n"
+      "  Enter or Insert, or a double click: adds the part.\r\n"
+      "\r\n"
+      "Editing the selected parts (Alt+E)\r\n"
+      "  Arrows move; typing replaces the cell; F2 or a double click edits it.\r\n"
+      "  Enter keeps the text and moves on; Escape takes the cell back.\r\n"
+      "  In the type column, F2 opens the list of part types; arrows and Enter pick one.\r\n"
+      "  Space or a double click ticks or clears \"Report Only\".\r\n"
+      "  Delete (Alt+D): removes the current part.");
 }
 
 void frmParts::cmdClose_Click() {

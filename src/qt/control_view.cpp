@@ -73,6 +73,20 @@ QString WithoutAccessKeys(const std::string& caption) {
   return out;
 }
 
+QString WithAccessKey(const std::string& caption, char32_t key) {
+  const QString plain = WithoutAccessKeys(caption);
+  QString escaped = plain;
+  escaped.replace(u'&', QStringLiteral("&&"));
+  if (key == 0) return escaped;
+  const QString letter = QString(QChar(static_cast<char16_t>(key)));
+  const qsizetype at = plain.indexOf(letter, 0, Qt::CaseInsensitive);
+  if (at < 0) return escaped;
+  // Each "&" before the letter became two.
+  const qsizetype before = plain.left(at).count(u'&');
+  escaped.insert(at + before, u'&');
+  return escaped;
+}
+
 std::string ControlName(const forms::Control& control) {
   std::string name = control.Name();
   if (control.Index() >= 0) name += "(" + std::to_string(control.Index()) + ")";

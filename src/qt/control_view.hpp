@@ -104,6 +104,9 @@ QString ToQString(std::string_view utf8);
 std::string ToUtf8(const QString& text);
 // A caption with its access-key marks: "&&" shows "&", a single "&" nothing.
 QString WithoutAccessKeys(const std::string& caption);
+// A caption as a Qt button shows it, with the control's access key (the
+// first letter of the caption that matches it) underlined.
+QString WithAccessKey(const std::string& caption, char32_t key);
 // The name of a control as handlers are named ("optSchedule(2)").
 std::string ControlName(const forms::Control& control);
 // Runs code that may raise form events from a view, outside any input path:

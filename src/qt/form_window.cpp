@@ -18,6 +18,7 @@
 #include <QPointer>
 #include <QRegularExpression>
 #include <QScreen>
+#include <QSettings>
 #include <QTimer>
 #include <QWindow>
 
@@ -60,12 +61,17 @@ private:
 
 FormWindow::FormWindow(QtRuntime& runtime, forms::Form& form, const Scale& scale)
     : QDialog(nullptr, Qt::Dialog | Qt::WindowTitleHint | Qt::WindowSystemMenuHint |
-                           Qt::WindowCloseButtonHint | Qt::MSWindowsFixedSizeDialogHint),
+                           Qt::WindowCloseButtonHint |
+                           (form.Sizable() ? Qt::WindowMaximizeButtonHint
+                                           : Qt::MSWindowsFixedSizeDialogHint)),
       runtime_(runtime), form_(&form), scale_(scale) {
   setObjectName(QString::fromStdString(form.Name()));
   setFocusPolicy(Qt::NoFocus);
   setContextMenuPolicy(Qt::NoContextMenu);
-  setSizeGripEnabled(false);
+  setSizeGripEnabled(form.Sizable());
+  // The style draws the focus frame on the control that has the keyboard,
+  // as after a Tab: the focus here always follows the keyboard's work.
+  setAttribute(Qt::WA_KeyboardFocusChange);
   installEventFilter(this);
   for (forms::Control* control : form.Controls())
     MakeView(*control);
@@ -96,9 +102,11 @@ void FormWindow::RefreshTotals() {
   totalsPending_ = false;
   if (!totals_ || !form_) return;
   const std::string line = form_->RunningTotals();
-  totals_->setVisible(!line.empty());
+  const bool shown = !line.empty();
   totals_->setText(ToQString(line));
-  ApplyGeometry();
+  const bool changed = totals_->isHidden() == shown;
+  totals_->setVisible(shown);
+  if (changed) SizeToForm();
 }
 
 FormWindow::~FormWindow() {
@@ -135,13 +143,55 @@ QWidget* FormWindow::ContainerWidget(const forms::Control& control) const {
 
 void FormWindow::ApplyGeometry() {
   if (!form_) return;
-  const int width = scale_.Pixels(form_->ScaleWidth());
-  const int height = scale_.Pixels(form_->ScaleHeight());
-  const int strip = totals_ && totals_->isVisibleTo(this) ? totals_->sizeHint().height() + 4 : 0;
-  if (totals_) totals_->setGeometry(0, height, width, strip);
-  setFixedSize(width, height + strip);
+  if (resizing_) return; // the form takes the size the window has
+  // A size given by code (the design, at load) is the smallest a sizable
+  // window takes.
+  minimum_ = QSize(scale_.Pixels(form_->ScaleWidth()), scale_.Pixels(form_->ScaleHeight()));
+  SizeToForm();
   if (placed_ && (form_->Left() != 0 || form_->Top() != 0))
     move(scale_.Pixels(form_->Left()), scale_.Pixels(form_->Top()));
+}
+
+int FormWindow::StripHeight() const {
+  return totals_ && !totals_->isHidden() ? totals_->sizeHint().height() + 4 : 0;
+}
+
+void FormWindow::SizeToForm() {
+  if (!form_) return;
+  const int strip = StripHeight();
+  if (form_->Sizable() && (isMaximized() || isFullScreen())) {
+    // The window keeps its size: the form's area is what the strip leaves.
+    TakeWindowSize();
+    return;
+  }
+  const int width = scale_.Pixels(form_->ScaleWidth());
+  const int height = scale_.Pixels(form_->ScaleHeight());
+  if (totals_) totals_->setGeometry(0, height, width, strip);
+  if (!form_->Sizable()) {
+    setFixedSize(width, height + strip);
+    return;
+  }
+  setMinimumSize(minimum_.width(), minimum_.height() + strip);
+  resizing_ = true;
+  resize(width, height + strip);
+  resizing_ = false;
+}
+
+void FormWindow::TakeWindowSize() {
+  if (!form_) return;
+  const int strip = StripHeight();
+  const int height = std::max(0, this->height() - strip);
+  if (totals_) totals_->setGeometry(0, height, width(), strip);
+  if (scale_.Pixels(form_->ScaleWidth()) == width() && scale_.Pixels(form_->ScaleHeight()) == height)
+    return;
+  resizing_ = true;
+  forms::Input::Resize(*form_, scale_.Twips(width()), scale_.Twips(height));
+  resizing_ = false;
+}
+
+void FormWindow::resizeEvent(QResizeEvent* event) {
+  QDialog::resizeEvent(event);
+  if (form_ && form_->Sizable() && !resizing_) TakeWindowSize();
 }
 
 void FormWindow::ApplyFont() {
@@ -151,7 +201,13 @@ void FormWindow::ApplyFont() {
 // A form placed by its design goes there; one at the origin is centred over
 // the window it belongs to, or on the screen.
 void FormWindow::Place() {
-  if (placed_ || !form_) return;
+  if (!form_) return;
+  // A sizable window opens where, and as large as, it was last closed.
+  if (RestorePlace()) {
+    placed_ = true;
+    return;
+  }
+  if (placed_) return;
   placed_ = true;
   if (form_->Left() != 0 || form_->Top() != 0) {
     move(scale_.Pixels(form_->Left()), scale_.Pixels(form_->Top()));
@@ -163,6 +219,25 @@ void FormWindow::Place() {
   else if (const QScreen* screen = QGuiApplication::primaryScreen())
     area = screen->availableGeometry();
   if (area.isValid()) move(area.center() - QPoint(width() / 2, height() / 2));
+}
+
+namespace {
+QString PlaceKey(const forms::Form& form) {
+  return QString::fromStdString(form.Name()) + QStringLiteral("/geometry");
+}
+} // namespace
+
+bool FormWindow::RestorePlace() {
+  if (!form_ || !form_->Sizable() || runtime_.WindowPlacesFile().empty()) return false;
+  const QSettings places(ToQString(runtime_.WindowPlacesFile()), QSettings::IniFormat);
+  const QByteArray geometry = places.value(PlaceKey(*form_)).toByteArray();
+  return !geometry.isEmpty() && restoreGeometry(geometry);
+}
+
+void FormWindow::RememberPlace() {
+  if (!form_ || !form_->Sizable() || runtime_.WindowPlacesFile().empty()) return;
+  QSettings places(ToQString(runtime_.WindowPlacesFile()), QSettings::IniFormat);
+  places.setValue(PlaceKey(*form_), saveGeometry());
 }
 
 void FormWindow::Restack() {
@@ -251,6 +326,7 @@ void FormWindow::RunModal(const std::function<void()>& shown) {
 
 void FormWindow::FormHidden() {
   if (isVisible()) {
+    RememberPlace();
     ParkFocus();
     hide();
   }

@@ -18,6 +18,7 @@
 
 class QEventLoop;
 class QKeyEvent;
+class QResizeEvent;
 
 namespace belvane::forms {
 class Control;
@@ -68,14 +69,27 @@ public:
 
 protected:
   void closeEvent(QCloseEvent* event) override;
+  // A sizable form takes the window's new client area (less the totals
+  // strip) and lays itself out for it.
+  void resizeEvent(QResizeEvent* event) override;
   void reject() override {}
   bool eventFilter(QObject* watched, QEvent* event) override;
 
 private:
   ControlView* MakeView(forms::Control& control);
+  // The model's size or place changed.
   void ApplyGeometry();
+  // The window's size from the form's client area and the totals strip.
+  void SizeToForm();
+  int StripHeight() const;
+  // Gives the form the window's client area (the user resized it).
+  void TakeWindowSize();
   void ApplyFont();
   void Place();
+  // The remembered size and place of a sizable window, in the runtime's
+  // places file; false when there is none.
+  bool RestorePlace();
+  void RememberPlace();
   bool Clipboard(QKeyEvent* event);
   void TypeText(const QString& text);
   void FormHidden();
@@ -95,6 +109,9 @@ private:
   std::map<const forms::Control*, ControlView*> views_;
   QEventLoop* loop_ = nullptr;
   bool placed_ = false;
+  // A sizable window never gets smaller than the size code gave its form.
+  QSize minimum_;
+  bool resizing_ = false; // the form is taking the window's size
 };
 
 } // namespace belvane::qt

@@ -9,6 +9,7 @@
 
 #include <QAbstractButton>
 #include <QApplication>
+#include <QStandardPaths>
 #include <QCursor>
 #include <QGuiApplication>
 #include <QMessageBox>
@@ -204,6 +205,11 @@ const Scale& QtRuntime::GetScale() {
 }
 
 // ---- windows ----
+
+std::string QtRuntime::DefaultWindowPlacesFile() {
+  const QString folder = QStandardPaths::writableLocation(QStandardPaths::AppConfigLocation);
+  return (folder + QStringLiteral("/windows.ini")).toStdString();
+}
 
 FormWindow& QtRuntime::WindowFor(forms::Form& form) {
   if (auto it = windows_.find(&form); it != windows_.end()) return *it->second;

@@ -100,6 +100,15 @@ public:
   // The scale twips are drawn at.
   const Scale& GetScale();
 
+  // Sizable windows (the editors) remember their size, place and maximised
+  // state in this file (an INI file) when they close, and open so again.
+  // Off (the design's size every time) until a host names a file; the
+  // usual one is DefaultWindowPlacesFile().
+  void RememberWindowPlaces(std::string file) { placesFile_ = std::move(file); }
+  const std::string& WindowPlacesFile() const noexcept { return placesFile_; }
+  // windows.ini in the user's configuration folder for the application.
+  static std::string DefaultWindowPlacesFile();
+
 private:
   friend class FormWindow;
   void Check(); // refuses a call off the GUI thread
@@ -114,6 +123,7 @@ private:
   std::vector<HandlerError> errors_;
   std::optional<Scale> scale_;
   bool showErrors_ = true;
+  std::string placesFile_;
   bool overriding_ = false; // the busy (or another) override cursor is ours
 };
 

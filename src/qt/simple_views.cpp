@@ -39,25 +39,49 @@ Qt::Alignment Justify(int alignment) {
   }
 }
 
-// A button's access key (Alt and the marked letter) clicks it, as a
-// click of the mouse does: the same input path, never Qt's own toggle.
-bool AccessKeyClick(ControlView& view, QEvent* event) {
-  if (event->type() != QEvent::Shortcut) return false;
-  forms::Control* control = view.Control();
-  if (control) {
-    const int x = control->Model().Width() / 2;
-    const int y = control->Model().Height() / 2;
-    if (forms::Input::MouseDown(*control, forms::kLeftButton, 0, x, y))
-      forms::Input::MouseUp(*control, forms::kLeftButton, 0, x, y);
-  }
-  return true;
+// A button's caption with its access key underlined. The key itself is the
+// forms' (Alt and the letter go to the form like any key), so Qt's own
+// shortcut for the marked letter is taken off again.
+void SetButtonCaption(QAbstractButton& button, const forms::Control& control,
+                      const std::string& caption) {
+  button.setText(WithAccessKey(caption, control.AccessKey()));
+  button.setShortcut(QKeySequence());
 }
+
+// A label that underlines its access key: the text stays the caption as
+// shown, and the painting marks the letter.
+class CaptionLabel : public QLabel {
+public:
+  using QLabel::QLabel;
+  void SetCaption(const std::string& caption, char32_t key) {
+    marked_ = WithAccessKey(caption, key);
+    setText(WithoutAccessKeys(caption));
+    if (marked_ == QString(text()).replace(u'&', QStringLiteral("&&"))) marked_.clear();
+    update();
+  }
+
+protected:
+  void paintEvent(QPaintEvent* event) override {
+    if (marked_.isEmpty()) {
+      QLabel::paintEvent(event);
+      return;
+    }
+    QPainter painter(this);
+    drawFrame(&painter);
+    style()->drawItemText(&painter, contentsRect(),
+                          static_cast<int>(alignment()) | Qt::TextWordWrap | Qt::TextShowMnemonic,
+                          palette(), isEnabled(), marked_, foregroundRole());
+  }
+
+private:
+  QString marked_; // the caption with its "&" mark; empty when none
+};
 
 class LabelView : public ControlView {
 public:
   LabelView(FormWindow& window, forms::Label& label, QWidget* parent)
-      : ControlView(window, label, new QLabel(parent)), label_(label),
-        widget_(static_cast<QLabel*>(Widget())) {
+      : ControlView(window, label, new CaptionLabel(parent)), label_(label),
+        widget_(static_cast<CaptionLabel*>(Widget())) {
     widget_->setWordWrap(true);
     widget_->setTextFormat(Qt::PlainText);
   }
@@ -70,7 +94,7 @@ public:
 protected:
   void Sync(grid::Property property) override {
     if (property == grid::Property::Caption)
-      widget_->setText(WithoutAccessKeys(label_.Caption()));
+      widget_->SetCaption(label_.Caption(), label_.AccessKey());
     else if (property == grid::Property::Alignment)
       widget_->setAlignment(Justify(label_.Alignment()) | Qt::AlignTop);
   }
@@ -86,7 +110,7 @@ protected:
 
 private:
   forms::Label& label_;
-  QLabel* widget_;
+  CaptionLabel* widget_;
 };
 
 class CommandButtonView : public ControlView {
@@ -106,7 +130,7 @@ public:
 protected:
   void Sync(grid::Property property) override {
     if (property == grid::Property::Caption) {
-      widget_->setText(ToQString(button_.Caption()));
+      SetButtonCaption(*widget_, button_, button_.Caption());
     } else if (property == grid::Property::Picture) {
       widget_->setIcon(PictureIcon(button_.Picture()));
     }
@@ -134,7 +158,6 @@ protected:
     }
     return true;
   }
-  bool Other(QWidget*, QEvent* event) override { return AccessKeyClick(*this, event); }
 
 private:
   forms::CommandButton& button_;
@@ -155,7 +178,7 @@ public:
 protected:
   void Sync(grid::Property property) override {
     if (property == grid::Property::Caption) {
-      widget_->setText(ToQString(box_.Caption()));
+      SetButtonCaption(*widget_, box_, box_.Caption());
     } else if (property == grid::Property::Value) {
       widget_->setTristate(box_.Value() == forms::kGrayed);
       widget_->setCheckState(box_.Value() == forms::kChecked  ? Qt::Checked
@@ -163,7 +186,6 @@ protected:
                                                               : Qt::Unchecked);
     }
   }
-  bool Other(QWidget*, QEvent* event) override { return AccessKeyClick(*this, event); }
 
 private:
   forms::CheckBox& box_;
@@ -186,11 +208,10 @@ public:
 protected:
   void Sync(grid::Property property) override {
     if (property == grid::Property::Caption)
-      widget_->setText(ToQString(option_.Caption()));
+      SetButtonCaption(*widget_, option_, option_.Caption());
     else if (property == grid::Property::Value)
       widget_->setChecked(option_.Value());
   }
-  bool Other(QWidget*, QEvent* event) override { return AccessKeyClick(*this, event); }
 
 private:
   forms::OptionButton& option_;
