@@ -312,18 +312,18 @@ void QuoteWindow::ShowQuote() {
   const auto count = [](size_t n, const char* one, const char* many) {
     return std::to_string(n) + " " + (n == 1 ? one : many);
   };
-  quoteStatus_->setText(
-      Q(header->qtnno + "  " + header->vehicle + "    " +
-        count(summary.lines.size(), "labour line", "labour lines") + ", " +
-        count(parts.lines.size(), "part", "parts") + "    Labour " + Hours(summary.TotalAmount()) +
-        ", parts " + Hours(parts.sell) + ", total " + Hours(summary.TotalAmount() + parts.sell)));
+  quoteStatus_->setText(Q(header->qtnno + "  " + header->vehicle + "    " +
+                          count(summary.lines.size(), "labour line", "labour lines") + ", " +
+                          count(parts.lines.size(), "part", "parts") + "    Labour " +
+                          Hours(summary.TotalAmount()) + ", parts " + Hours(parts.sell) +
+                          ", total " + Hours(summary.TotalAmount() + parts.sell)));
 }
 
 void QuoteWindow::ChooseDatabase() {
   const QString folder = QFileInfo(Q(store_->Path())).absolutePath();
-  const QString path = QFileDialog::getOpenFileName(
-      this, "Open quote database", folder,
-      "Quote databases (*.db *.sqlite *.sqlite3);;All files (*)");
+  const QString path =
+      QFileDialog::getOpenFileName(this, "Open quote database", folder,
+                                   "Quote databases (*.db *.sqlite *.sqlite3);;All files (*)");
   if (!path.isEmpty()) OpenDatabase(path.toStdString());
 }
 
@@ -344,8 +344,8 @@ bool QuoteWindow::OpenDatabase(const std::string& path) {
     // Looked at read-only first: opening a store creates its tables, and a
     // file that is something else (a catalogue, say) must stay as it is.
     {
-      data::sqlite::Database probe(path, data::sqlite::Database::Mode::ReadOnly,
-                                   "Quote database", "Belvane.Quote");
+      data::sqlite::Database probe(path, data::sqlite::Database::Mode::ReadOnly, "Quote database",
+                                   "Belvane.Quote");
       if (!probe.HasTable("quotes") || !probe.HasTable("quote_items"))
         return refuse("It has no table of quotes and their items.");
       const data::RecordsetPtr items = data::QuoteStore::NewItemRecordset();

@@ -92,8 +92,8 @@ private:
   std::string OpenEditor(EQuoteEditMode mode, data::ItemKind kind, const EditorCall& open);
   void Report(const std::string& message);
 
-  struct State; // the quote list and CForms
-  data::QuoteStore* store_;                 // the database shown
+  struct State;                              // the quote list and CForms
+  data::QuoteStore* store_;                  // the database shown
   std::unique_ptr<data::QuoteStore> opened_; // one opened from the menu
   std::unique_ptr<State> state_;
   bool columnsSized_ = false;
