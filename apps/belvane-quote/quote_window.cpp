@@ -167,11 +167,15 @@ QuoteWindow::QuoteWindow(data::QuoteStore& store, QWidget* parent)
   quoteStatus_ = new QLabel(this);
   quoteStatus_->setObjectName("QuoteStatus");
   statusBar()->addPermanentWidget(quoteStatus_);
+  // Menus show their items' tips in the status bar and clear it after; what
+  // the last session did comes back then.
+  connect(statusBar(), &QStatusBar::messageChanged, this, [this](const QString& message) {
+    if (message.isEmpty() && !lastReport_.isEmpty()) statusBar()->showMessage(lastReport_);
+  });
   MakeMenus();
 
   Reload();
-  statusBar()->showMessage("Select a quote, then press Enter or Edit labour to edit its labour, "
-                           "or Edit parts for its parts. Help > Keys lists the keys.");
+  Report("Enter edits the selected quote's labour. F1 lists the keys.");
 }
 
 void QuoteWindow::MakeMenus() {
@@ -314,9 +318,8 @@ void QuoteWindow::ShowQuote() {
   };
   quoteStatus_->setText(Q(header->qtnno + "  " + header->vehicle + "    " +
                           count(summary.lines.size(), "labour line", "labour lines") + ", " +
-                          count(parts.lines.size(), "part", "parts") + "    Labour " +
-                          Hours(summary.TotalAmount()) + ", parts " + Hours(parts.sell) +
-                          ", total " + Hours(summary.TotalAmount() + parts.sell)));
+                          count(parts.lines.size(), "part", "parts") + "    Total " +
+                          Hours(summary.TotalAmount() + parts.sell)));
 }
 
 void QuoteWindow::ChooseDatabase() {
@@ -370,7 +373,7 @@ bool QuoteWindow::OpenDatabase(const std::string& path) {
 
 QString QuoteWindow::KeysText() {
   return "<table cellspacing=4>"
-         "<tr><td><b>Up, Down, Page Up, Page Down, Home, End</b></td>"
+         "<tr><td><b>Up</b>, <b>Down</b>, <b>Home</b>, <b>End</b></td>"
          "<td>choose a quote in the list</td></tr>"
          "<tr><td><b>Enter</b> or <b>double-click</b> on a quote</td>"
          "<td>edit its labour (as Edit labour)</td></tr>"
@@ -407,7 +410,10 @@ void QuoteWindow::ShowAbout() {
           .arg(kAppName, BELVANE_VERSION));
 }
 
-void QuoteWindow::Report(const std::string& message) { statusBar()->showMessage(Q(message)); }
+void QuoteWindow::Report(const std::string& message) {
+  lastReport_ = Q(message);
+  statusBar()->showMessage(lastReport_);
+}
 
 std::string QuoteWindow::OpenLabour(EQuoteEditMode mode) {
   return OpenEditor(mode, data::ItemKind::Labour,

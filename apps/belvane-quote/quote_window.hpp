@@ -15,6 +15,7 @@
 #include "host/component_state.hpp"
 
 #include <QMainWindow>
+#include <QString>
 
 #include <functional>
 #include <memory>
@@ -109,6 +110,7 @@ private:
   QTableWidget* parts_;
   QTableWidget* totals_;
   QLabel* quoteStatus_;
+  QString lastReport_; // what the last editor session (or database change) did
   QAction* open_;
   QAction* quit_;
   QAction* keys_;

@@ -23,6 +23,7 @@
 #include <QPushButton>
 #include <QRegularExpression>
 #include <QStatusBar>
+#include <QStatusTipEvent>
 #include <QTableWidget>
 #include <QTest>
 #include <QTimer>
@@ -310,11 +311,18 @@ TEST_F(QuoteHostTest, EnterOnAQuoteEditsItsLabourAndTheStatusBarFollowsTheSelect
   EXPECT_EQ(window.CurrentQuote(), "Q1001");
   EXPECT_EQ(window.statusBar()->currentMessage().toStdString(),
             "Q1001: stored 1 new, 0 changed and 0 deleted records.");
+  // A menu item's tip passes through the status bar; the result comes back.
+  QStatusTipEvent tip("Show the quotes of another quote database");
+  QApplication::sendEvent(&window, &tip);
+  QStatusTipEvent gone("");
+  QApplication::sendEvent(&window, &gone);
+  EXPECT_EQ(window.statusBar()->currentMessage().toStdString(),
+            "Q1001: stored 1 new, 0 changed and 0 deleted records.");
   const quote::QuoteSummary after = quote::StoredSummary(store, "Q1001");
   ASSERT_EQ(after.lines.size(), first.lines.size() + 1);
   const double total = after.TotalAmount() + quote::StoredPartsSummary(store, "Q1001").sell;
   EXPECT_TRUE(
-      window.QuoteStatus()->text().endsWith(QString::fromStdString("total " + quote::Hours(total))))
+      window.QuoteStatus()->text().endsWith(QString::fromStdString("Total " + quote::Hours(total))))
       << window.QuoteStatus()->text().toStdString();
 
   // The keypad's Enter does the same; with Ctrl held it does nothing.
