@@ -1,7 +1,8 @@
 // belvane-quote: a small desktop quoting application over a quote database,
 // the demo host of the component. It shows the quotes with their vehicles,
 // opens the labour editor on a quote through CForms and the Qt runtime, and
-// stores exactly what changed.
+// stores exactly what changed. File > Open quote database... shows another
+// quote database.
 //
 //   belvane-quote [--catalogue FILE] [--quotes FILE]
 //   belvane-quote --demo [--screenshots DIR]     (a scripted session)
@@ -84,21 +85,22 @@ int main(int argc, char** argv) {
     }
     data::SetCatalogueLocation(catalogue);
     // The scripted session starts from the sample quotes every time, on a
-    // quote database of its own that goes when it ends.
+    // quote database of its own (quotes.db, as the window's caption shows
+    // it, in a folder of its own) that goes when it ends.
     struct Scratch {
-      std::string path;
+      fs::path folder;
       ~Scratch() {
         std::error_code ignored;
-        if (!path.empty()) fs::remove(path, ignored);
+        if (!folder.empty()) fs::remove_all(folder, ignored);
       }
     } scratch;
     if (quotesPath.empty()) {
       if (demo) {
-        scratch.path =
-            (fs::temp_directory_path() / ("belvane-quote-demo-" + std::to_string(getpid()) + ".db"))
-                .string();
-        fs::remove(scratch.path);
-        quotesPath = scratch.path;
+        scratch.folder =
+            fs::temp_directory_path() / ("belvane-quote-demo-" + std::to_string(getpid()));
+        fs::remove_all(scratch.folder);
+        fs::create_directories(scratch.folder);
+        quotesPath = (scratch.folder / "quotes.db").string();
       } else {
         quotesPath = (fs::path(catalogue).parent_path() / "quotes.db").string();
       }

@@ -1,14 +1,20 @@
 #include "quote_window.hpp"
 
 #include "data/quote_store.hpp"
+#include "data/sqlite/sqlite_db.hpp"
 #include "entry/cforms.hpp"
 #include "quote_summary.hpp"
 #include "text/error.hpp"
 #include "text/number.hpp"
 
+#include <QAction>
+#include <QFileDialog>
+#include <QFileInfo>
 #include <QHBoxLayout>
 #include <QHeaderView>
+#include <QKeyEvent>
 #include <QLabel>
+#include <QMenuBar>
 #include <QMessageBox>
 #include <QPushButton>
 #include <QSplitter>
@@ -16,11 +22,25 @@
 #include <QTableWidget>
 #include <QVBoxLayout>
 
+#include <filesystem>
+
+#ifndef BELVANE_VERSION
+#define BELVANE_VERSION ""
+#endif
+
 namespace belvane::quote {
 
 namespace {
 
 QString Q(const std::string& s) { return QString::fromStdString(s); }
+
+constexpr const char* kAppName = "Belvane Quote";
+
+// "quotes.db - Belvane Quote": the database in the caption, the program's
+// name last (the window system adds it only when the caption lacks it).
+QString Caption(const std::string& path) {
+  return QFileInfo(Q(path)).fileName() + QString::fromUtf8(" \u2014 ") + kAppName;
+}
 
 QTableWidget* MakeTable(const QStringList& titles, QWidget* parent) {
   auto* table = new QTableWidget(0, static_cast<int>(titles.size()), parent);
@@ -64,9 +84,9 @@ struct QuoteWindow::State {
 QuoteWindow::~QuoteWindow() = default;
 
 QuoteWindow::QuoteWindow(data::QuoteStore& store, QWidget* parent)
-    : QMainWindow(parent), store_(store), state_(std::make_unique<State>()) {
+    : QMainWindow(parent), store_(&store), state_(std::make_unique<State>()) {
   setObjectName("QuoteWindow");
-  setWindowTitle("Belvane Quote");
+  setWindowTitle(Caption(store.Path()));
   auto* splitter = new QSplitter(this);
 
   auto* left = new QWidget(splitter);
@@ -140,15 +160,54 @@ QuoteWindow::QuoteWindow(data::QuoteStore& store, QWidget* parent)
   connect(viewLabour_, &QPushButton::clicked, this, [this] { OpenLabour(eView); });
   connect(editParts_, &QPushButton::clicked, this, [this] { OpenParts(eEdit); });
   connect(viewParts_, &QPushButton::clicked, this, [this] { OpenParts(eView); });
+  quotes_->installEventFilter(this);
+
+  // The selected quote stays on the right of the status bar; the left is
+  // for what the last editor session (or database change) did.
+  quoteStatus_ = new QLabel(this);
+  quoteStatus_->setObjectName("QuoteStatus");
+  statusBar()->addPermanentWidget(quoteStatus_);
+  // Menus show their items' tips in the status bar and clear it after; what
+  // the last session did comes back then.
+  connect(statusBar(), &QStatusBar::messageChanged, this, [this](const QString& message) {
+    if (message.isEmpty() && !lastReport_.isEmpty()) statusBar()->showMessage(lastReport_);
+  });
+  MakeMenus();
 
   Reload();
-  statusBar()->showMessage(
-      "Select a quote, then Edit labour or Edit parts to open the labour or the parts editor.");
+  Report("Enter edits the selected quote's labour. F1 lists the keys.");
+}
+
+void QuoteWindow::MakeMenus() {
+  QMenu* file = menuBar()->addMenu("&File");
+  open_ = file->addAction("&Open quote database...", this, [this] { ChooseDatabase(); });
+  open_->setShortcut(QKeySequence::Open);
+  open_->setStatusTip("Show the quotes of another quote database");
+  file->addSeparator();
+  quit_ = file->addAction("&Quit", this, [this] { close(); });
+  quit_->setShortcut(QKeySequence(Qt::CTRL | Qt::Key_Q));
+  QMenu* help = menuBar()->addMenu("&Help");
+  keys_ = help->addAction("&Keys", this, [this] { ShowKeys(); });
+  keys_->setShortcut(QKeySequence(Qt::Key_F1));
+  about_ = help->addAction("&About", this, [this] { ShowAbout(); });
+}
+
+bool QuoteWindow::eventFilter(QObject* watched, QEvent* event) {
+  if (watched == quotes_ && event->type() == QEvent::KeyPress) {
+    const auto* key = static_cast<QKeyEvent*>(event);
+    const bool enter = key->key() == Qt::Key_Return || key->key() == Qt::Key_Enter;
+    if (enter && (key->modifiers() & ~Qt::KeypadModifier) == Qt::NoModifier &&
+        !CurrentQuote().empty()) {
+      OpenLabour(eEdit);
+      return true;
+    }
+  }
+  return QMainWindow::eventFilter(watched, event);
 }
 
 void QuoteWindow::Reload() {
   const std::string selected = CurrentQuote();
-  state_->headers = store_.ListQuotes();
+  state_->headers = store_->ListQuotes();
   const QSignalBlocker quiet(quotes_);
   quotes_->setRowCount(static_cast<int>(state_->headers.size()));
   for (int r = 0; r < static_cast<int>(state_->headers.size()); ++r) {
@@ -157,7 +216,10 @@ void QuoteWindow::Reload() {
     quotes_->setItem(r, 1, Cell(Q(h.customer)));
     quotes_->setItem(r, 2, Cell(Q(h.vehicle)));
   }
-  quotes_->resizeColumnsToContents();
+  if (!columnsSized_ && !state_->headers.empty()) {
+    quotes_->resizeColumnsToContents();
+    columnsSized_ = true;
+  }
   if (selected.empty() || !SelectQuote(selected)) {
     if (!state_->headers.empty()) quotes_->selectRow(0);
   }
@@ -180,7 +242,7 @@ std::string QuoteWindow::CurrentQuote() const {
 }
 
 void QuoteWindow::ShowQuote() {
-  const auto header = store_.GetQuote(CurrentQuote());
+  const auto header = store_->GetQuote(CurrentQuote());
   for (QPushButton* b : {editLabour_, viewLabour_, editParts_, viewParts_})
     b->setEnabled(header.has_value());
   lines_->setRowCount(0);
@@ -189,6 +251,8 @@ void QuoteWindow::ShowQuote() {
     title_->setText("No quote selected");
     vehicle_->clear();
     context_->clear();
+    quoteStatus_->setText(state_->headers.empty() ? "No quotes in this database"
+                                                  : "No quote selected");
     return;
   }
   title_->setText(Q(header->qtnno + "  " + header->customer));
@@ -197,7 +261,7 @@ void QuoteWindow::ShowQuote() {
                       Hours(header->rrRate) + ", Repair " + Hours(header->raRate) + ", Paint " +
                       Hours(header->ptRate)));
 
-  const QuoteSummary summary = StoredSummary(store_, header->qtnno);
+  const QuoteSummary summary = StoredSummary(*store_, header->qtnno);
   lines_->setRowCount(static_cast<int>(summary.lines.size()));
   for (int r = 0; r < static_cast<int>(summary.lines.size()); ++r) {
     const SummaryLine& line = summary.lines[static_cast<size_t>(r)];
@@ -218,7 +282,7 @@ void QuoteWindow::ShowQuote() {
   totals_->setItem(3, 1, Cell(Q(Hours(summary.TotalHours())), true));
   totals_->setItem(3, 2, Cell(Q(Hours(summary.TotalAmount())), true));
 
-  const PartsSummary parts = StoredPartsSummary(store_, header->qtnno);
+  const PartsSummary parts = StoredPartsSummary(*store_, header->qtnno);
   parts_->setRowCount(static_cast<int>(parts.lines.size()));
   for (int r = 0; r < static_cast<int>(parts.lines.size()); ++r) {
     const PartLine& part = parts.lines[static_cast<size_t>(r)];
@@ -248,9 +312,108 @@ void QuoteWindow::ShowQuote() {
       bold.setBold(true);
       totals_->item(r, c)->setFont(bold);
     }
+
+  const auto count = [](size_t n, const char* one, const char* many) {
+    return std::to_string(n) + " " + (n == 1 ? one : many);
+  };
+  quoteStatus_->setText(Q(header->qtnno + "  " + header->vehicle + "    " +
+                          count(summary.lines.size(), "labour line", "labour lines") + ", " +
+                          count(parts.lines.size(), "part", "parts") + "    Total " +
+                          Hours(summary.TotalAmount() + parts.sell)));
 }
 
-void QuoteWindow::Report(const std::string& message) { statusBar()->showMessage(Q(message)); }
+void QuoteWindow::ChooseDatabase() {
+  const QString folder = QFileInfo(Q(store_->Path())).absolutePath();
+  const QString path =
+      QFileDialog::getOpenFileName(this, "Open quote database", folder,
+                                   "Quote databases (*.db *.sqlite *.sqlite3);;All files (*)");
+  if (!path.isEmpty()) OpenDatabase(path.toStdString());
+}
+
+bool QuoteWindow::OpenDatabase(const std::string& path) {
+  const auto refuse = [this, &path](const std::string& why) {
+    const QString name = QFileInfo(Q(path)).fileName();
+    QMessageBox::warning(this, "Not a quote database",
+                         name + " is not a quote database, so it was not opened.\n\n" + Q(why) +
+                             "\n\nThe quotes of " + QFileInfo(Q(store_->Path())).fileName() +
+                             " are still shown.");
+    Report(path + " was not opened: it is not a quote database.");
+    return false;
+  };
+  std::error_code ec;
+  if (!std::filesystem::is_regular_file(path, ec)) return refuse("There is no such file.");
+  std::unique_ptr<data::QuoteStore> store;
+  try {
+    // Looked at read-only first: opening a store creates its tables, and a
+    // file that is something else (a catalogue, say) must stay as it is.
+    {
+      data::sqlite::Database probe(path, data::sqlite::Database::Mode::ReadOnly, "Quote database",
+                                   "Belvane.Quote");
+      if (!probe.HasTable("quotes") || !probe.HasTable("quote_items"))
+        return refuse("It has no table of quotes and their items.");
+      const data::RecordsetPtr items = data::QuoteStore::NewItemRecordset();
+      std::string columns;
+      for (size_t i = 0; i < items->Fields().Count(); ++i)
+        columns += (i ? ", " : "") + items->Fields().Item(i).name;
+      data::sqlite::Statement read(probe, "SELECT " + columns + " FROM quote_items LIMIT 0");
+    }
+    store = std::make_unique<data::QuoteStore>(path);
+    store->ListQuotes(); // the quotes' columns are all there
+  } catch (const Error& e) {
+    return refuse(e.Description());
+  }
+  opened_ = std::move(store);
+  store_ = opened_.get();
+  setWindowTitle(Caption(path));
+  Reload();
+  const size_t n = state_->headers.size();
+  Report("Opened " + path + ": " + std::to_string(n) + (n == 1 ? " quote." : " quotes."));
+  return true;
+}
+
+QString QuoteWindow::KeysText() {
+  return "<table cellspacing=4>"
+         "<tr><td><b>Up</b>, <b>Down</b>, <b>Home</b>, <b>End</b></td>"
+         "<td>choose a quote in the list</td></tr>"
+         "<tr><td><b>Enter</b> or <b>double-click</b> on a quote</td>"
+         "<td>edit its labour (as Edit labour)</td></tr>"
+         "<tr><td><b>Alt+E</b>, Edit labour...</td><td>edit the quote's labour</td></tr>"
+         "<tr><td><b>Alt+V</b>, View labour...</td>"
+         "<td>look at the quote's labour, nothing is changed</td></tr>"
+         "<tr><td><b>Alt+P</b>, Edit parts...</td><td>edit the quote's parts</td></tr>"
+         "<tr><td><b>Alt+W</b>, View parts...</td>"
+         "<td>look at the quote's parts, nothing is changed</td></tr>"
+         "<tr><td><b>Tab</b>, <b>Shift+Tab</b></td>"
+         "<td>move between the quote list, the buttons and the tables</td></tr>"
+         "<tr><td><b>Ctrl+O</b></td><td>open another quote database</td></tr>"
+         "<tr><td><b>Alt+F</b>, <b>Alt+H</b></td><td>the File and Help menus</td></tr>"
+         "<tr><td><b>F1</b></td><td>this list</td></tr>"
+         "<tr><td><b>Ctrl+Q</b></td><td>quit</td></tr>"
+         "</table>"
+         "<p>Closing an editor opened to edit stores what changed in the quote at once; the "
+         "status bar says what was stored. An editor opened to look stores nothing.</p>";
+}
+
+void QuoteWindow::ShowKeys() {
+  QMessageBox box(QMessageBox::Information, "Keys", KeysText(), QMessageBox::Ok, this);
+  box.setTextFormat(Qt::RichText);
+  box.exec();
+}
+
+void QuoteWindow::ShowAbout() {
+  QMessageBox::about(
+      this, QString("About ") + kAppName,
+      QString("<p><b>%1</b> %2</p>"
+              "<p>A desktop quoting application over a quote database: it lists the quotes with "
+              "their vehicles, opens the Belvane labour and parts editors on a quote, and "
+              "stores what changed.</p>")
+          .arg(kAppName, BELVANE_VERSION));
+}
+
+void QuoteWindow::Report(const std::string& message) {
+  lastReport_ = Q(message);
+  statusBar()->showMessage(lastReport_);
+}
 
 std::string QuoteWindow::OpenLabour(EQuoteEditMode mode) {
   return OpenEditor(mode, data::ItemKind::Labour,
@@ -281,20 +444,20 @@ std::string QuoteWindow::OpenParts(EQuoteEditMode mode) {
 
 std::string QuoteWindow::OpenEditor(EQuoteEditMode mode, data::ItemKind kind,
                                     const EditorCall& open) {
-  auto header = store_.GetQuote(CurrentQuote());
+  auto header = store_->GetQuote(CurrentQuote());
   if (!header) return {};
   const std::string qtnno = header->qtnno;
   const std::string schedType = header->schedType;
   std::string message;
   try {
-    data::RecordsetPtr items = store_.LoadItems(qtnno, kind);
+    data::RecordsetPtr items = store_->LoadItems(qtnno, kind);
     const std::string more = open(items, *header);
     if (mode == eEdit) {
-      const data::SaveSummary saved = store_.SaveItems(qtnno, *items);
+      const data::SaveSummary saved = store_->SaveItems(qtnno, *items);
       message = qtnno + ": stored " + std::to_string(saved.inserted) + " new, " +
                 std::to_string(saved.updated) + " changed and " + std::to_string(saved.deleted) +
                 " deleted records." + more;
-      if (header->schedType != schedType) store_.SaveQuote(*header);
+      if (header->schedType != schedType) store_->SaveQuote(*header);
     } else {
       message = qtnno + ": viewed, nothing to store.";
     }

@@ -1,9 +1,11 @@
 // The demo host: sample quotes, lines and totals, an edit stored in one
-// transaction and shown after it, a failed store that stores nothing.
+// transaction and shown after it, a failed store that stores nothing; the
+// keys, menus and status bar of a working day.
 
 #include "../data/temp_dir.hpp"
 #include "data/catalogue.hpp"
 #include "data/quote_store.hpp"
+#include "host/component_state.hpp"
 #include "labour/frm_labour.hpp"
 #include "parts/frm_parts.hpp"
 #include "qt/grid_view.hpp"
@@ -12,10 +14,16 @@
 #include "quote_window.hpp"
 #include "sample_quotes.hpp"
 
+#include <QAction>
 #include <QApplication>
+#include <QFileDialog>
+#include <QHeaderView>
+#include <QLabel>
 #include <QMessageBox>
 #include <QPushButton>
+#include <QRegularExpression>
 #include <QStatusBar>
+#include <QStatusTipEvent>
 #include <QTableWidget>
 #include <QTest>
 #include <QTimer>
@@ -23,8 +31,12 @@
 #include <gtest/gtest.h>
 #include <sqlite3.h>
 
+#include <filesystem>
+#include <fstream>
+#include <functional>
 #include <optional>
 #include <set>
+#include <sstream>
 
 using namespace belvane;
 namespace col = belvane::labour::col;
@@ -71,6 +83,27 @@ protected:
       QTest::keyClick(QApplication::focusWidget(), c.toLatin1());
     QTest::keyClick(QApplication::focusWidget(), Qt::Key_Return);
     QTest::mouseClick(runtime_->Widget(form.cmdClose), Qt::LeftButton);
+  }
+
+  // Answers the modal windows the host opens while it lives: `answer` gets
+  // each one and returns whether it closed it.
+  struct Answer {
+    explicit Answer(std::function<bool(QWidget*)> answer) {
+      QObject::connect(&timer, &QTimer::timeout, [this, answer] {
+        if (QWidget* modal = QApplication::activeModalWidget(); modal && answer(modal)) ++answered;
+      });
+      timer.start(10);
+    }
+    QTimer timer;
+    int answered = 0;
+  };
+
+  // A shown, active window over `store`, the quote list with the keyboard.
+  static void ShowActive(quote::QuoteWindow& window) {
+    window.show();
+    window.activateWindow();
+    ASSERT_TRUE(QTest::qWaitForWindowActive(&window));
+    window.QuoteList()->setFocus();
   }
 
   test::TempDir dir{"quote-host"};
@@ -239,4 +272,199 @@ TEST_F(QuoteHostTest, ThePartsEditorOpensOverTheQuotesPartsAndItsEditIsStored) {
   });
   QTest::mouseClick(window.ViewPartsButton(), Qt::LeftButton);
   EXPECT_EQ(window.statusBar()->currentMessage(), "Q1001: viewed, nothing to store.");
+}
+
+TEST_F(QuoteHostTest, EnterOnAQuoteEditsItsLabourAndTheStatusBarFollowsTheSelection) {
+  quote::QuoteWindow window(store);
+  ShowActive(window);
+  ASSERT_EQ(window.CurrentQuote(), "Q1001");
+  const QString firstVehicle = QString::fromStdString(store.GetQuote("Q1001")->vehicle);
+  EXPECT_TRUE(window.QuoteStatus()->text().startsWith("Q1001  " + firstVehicle))
+      << window.QuoteStatus()->text().toStdString();
+
+  QTest::keyClick(window.QuoteList(), Qt::Key_Down);
+  ASSERT_EQ(window.CurrentQuote(), "Q1002");
+  const auto second = store.GetQuote("Q1002");
+  const quote::QuoteSummary labour = quote::StoredSummary(store, "Q1002");
+  const QString status = window.QuoteStatus()->text();
+  EXPECT_TRUE(status.startsWith(QString::fromStdString("Q1002  " + second->vehicle)))
+      << status.toStdString();
+  EXPECT_TRUE(status.contains(QString::number(labour.lines.size()) + " labour lines"))
+      << status.toStdString();
+
+  QTest::keyClick(window.QuoteList(), Qt::Key_Up);
+  ASSERT_EQ(window.CurrentQuote(), "Q1001");
+  EXPECT_TRUE(window.QuoteStatus()->text().startsWith("Q1001  " + firstVehicle));
+
+  // Return: the labour editor in edit mode on that quote; what it adds is
+  // stored, and the status bar sums the quote up again.
+  const quote::QuoteSummary first = quote::StoredSummary(store, "Q1001");
+  std::optional<EQuoteEditMode> mode;
+  runtime_->QueueModal([&](forms::Form& f) {
+    auto& form = static_cast<labour::frmLabour&>(f);
+    mode = form.Mode();
+    AddAnItem(form, "2");
+  });
+  QTest::keyClick(window.QuoteList(), Qt::Key_Return);
+  ASSERT_EQ(mode, eEdit);
+  EXPECT_FALSE(host::gbLabourFormLoaded);
+  EXPECT_EQ(window.CurrentQuote(), "Q1001");
+  EXPECT_EQ(window.statusBar()->currentMessage().toStdString(),
+            "Q1001: stored 1 new, 0 changed and 0 deleted records.");
+  // A menu item's tip passes through the status bar; the result comes back.
+  QStatusTipEvent tip("Show the quotes of another quote database");
+  QApplication::sendEvent(&window, &tip);
+  QStatusTipEvent gone("");
+  QApplication::sendEvent(&window, &gone);
+  EXPECT_EQ(window.statusBar()->currentMessage().toStdString(),
+            "Q1001: stored 1 new, 0 changed and 0 deleted records.");
+  const quote::QuoteSummary after = quote::StoredSummary(store, "Q1001");
+  ASSERT_EQ(after.lines.size(), first.lines.size() + 1);
+  const double total = after.TotalAmount() + quote::StoredPartsSummary(store, "Q1001").sell;
+  EXPECT_TRUE(
+      window.QuoteStatus()->text().endsWith(QString::fromStdString("Total " + quote::Hours(total))))
+      << window.QuoteStatus()->text().toStdString();
+
+  // The keypad's Enter does the same; with Ctrl held it does nothing.
+  mode.reset();
+  runtime_->QueueModal([&](forms::Form& f) {
+    mode = static_cast<labour::frmLabour&>(f).Mode();
+    QTest::mouseClick(runtime_->Widget(static_cast<labour::frmLabour&>(f).cmdClose),
+                      Qt::LeftButton);
+  });
+  QTest::keyClick(window.QuoteList(), Qt::Key_Enter, Qt::KeypadModifier);
+  EXPECT_EQ(mode, eEdit);
+  mode.reset();
+  QTest::keyClick(window.QuoteList(), Qt::Key_Return, Qt::ControlModifier);
+  EXPECT_FALSE(mode.has_value());
+}
+
+TEST_F(QuoteHostTest, TheQuoteListKeepsTheEstimatorsColumnWidths) {
+  quote::QuoteWindow window(store);
+  ShowActive(window);
+  QTableWidget* list = window.QuoteList();
+  // The first fill sizes the columns to what they hold.
+  EXPECT_GE(list->columnWidth(1), list->fontMetrics().horizontalAdvance("Harbour Fleet Services"));
+
+  list->horizontalHeader()->resizeSection(0, 140); // as a drag on the header would
+  list->horizontalHeader()->resizeSection(1, 70);
+  const auto widths = [list] { return std::pair(list->columnWidth(0), list->columnWidth(1)); };
+  const auto set = std::pair(140, 70);
+
+  window.Reload();
+  EXPECT_EQ(widths(), set);
+  runtime_->QueueModal([&](forms::Form& f) {
+    QTest::mouseClick(runtime_->Widget(static_cast<labour::frmLabour&>(f).cmdClose),
+                      Qt::LeftButton);
+  });
+  QTest::mouseClick(window.EditLabourButton(), Qt::LeftButton);
+  EXPECT_EQ(widths(), set) << "after an editor closed";
+
+  data::QuoteStore other(dir.File("other.db"));
+  ASSERT_EQ(quote::AddSampleQuotes(other), 4);
+  ASSERT_TRUE(window.OpenDatabase(dir.File("other.db")));
+  EXPECT_EQ(widths(), set) << "after another database was opened";
+}
+
+TEST_F(QuoteHostTest, OpenQuoteDatabaseSwitchesAndABadFileKeepsTheCurrentOne) {
+  // Another database, told apart by its customer; edits go to it once open.
+  const std::string otherPath = dir.File("other.db");
+  data::QuoteStore other(otherPath);
+  ASSERT_EQ(quote::AddSampleQuotes(other), 4);
+  data::QuoteHeader renamed = *other.GetQuote("Q1003");
+  renamed.customer = "Other Motors";
+  other.SaveQuote(renamed);
+
+  quote::QuoteWindow window(store);
+  ShowActive(window);
+  ASSERT_TRUE(window.SelectQuote("Q1003"));
+  Answer pick([&](QWidget* modal) {
+    auto* dialog = qobject_cast<QFileDialog*>(modal);
+    if (!dialog) return false;
+    dialog->selectFile(QString::fromStdString(otherPath));
+    static_cast<QDialog*>(dialog)->accept(); // its Open button
+    return true;
+  });
+  QTest::keyClick(&window, Qt::Key_O, Qt::ControlModifier); // File > Open quote database...
+  ASSERT_EQ(pick.answered, 1);
+  EXPECT_EQ(window.Store().Path(), otherPath);
+  EXPECT_TRUE(window.windowTitle().startsWith("other.db"));
+  EXPECT_EQ(window.CurrentQuote(), "Q1003");
+  EXPECT_EQ(window.QuoteList()->item(2, 1)->text(), "Other Motors");
+  EXPECT_EQ(window.statusBar()->currentMessage().toStdString(),
+            "Opened " + otherPath + ": 4 quotes.");
+
+  runtime_->QueueModal(
+      [this](forms::Form& f) { AddAnItem(static_cast<labour::frmLabour&>(f), "1"); });
+  const size_t first = quote::StoredSummary(store, "Q1003").lines.size();
+  const size_t before = quote::StoredSummary(other, "Q1003").lines.size();
+  QTest::keyClick(window.QuoteList(), Qt::Key_Return);
+  EXPECT_EQ(quote::StoredSummary(other, "Q1003").lines.size(), before + 1);
+  EXPECT_EQ(quote::StoredSummary(store, "Q1003").lines.size(), first);
+
+  // Files that are not quote databases: plain text, a copy of the catalogue
+  // (an SQLite database of another kind, which must stay as it was), tables
+  // of the right names with the wrong columns, and no file at all.
+  const std::string text = dir.File("notes.txt");
+  std::ofstream(text) << "Not a database\n";
+  const std::string catalogue = dir.File("catalogue.db");
+  std::filesystem::copy_file(BELVANE_SAMPLE_CATALOGUE, catalogue);
+  const auto bytes = [](const std::string& path) {
+    std::ostringstream all;
+    all << std::ifstream(path, std::ios::binary).rdbuf();
+    return all.str();
+  };
+  const std::string catalogueBytes = bytes(catalogue);
+  const std::string wrong = dir.File("wrong.db");
+  sqlite3* db = nullptr;
+  ASSERT_EQ(sqlite3_open(wrong.c_str(), &db), SQLITE_OK);
+  ASSERT_EQ(sqlite3_exec(db, "CREATE TABLE quotes (qtnno TEXT); CREATE TABLE quote_items (x)",
+                         nullptr, nullptr, nullptr),
+            SQLITE_OK);
+  sqlite3_close(db);
+
+  for (const std::string& bad : {text, catalogue, wrong, dir.File("missing.db")}) {
+    SCOPED_TRACE(bad);
+    QString said;
+    Answer ok([&said](QWidget* modal) {
+      auto* box = qobject_cast<QMessageBox*>(modal);
+      if (!box) return false;
+      said = box->text();
+      box->button(QMessageBox::Ok)->click();
+      return true;
+    });
+    EXPECT_FALSE(window.OpenDatabase(bad));
+    EXPECT_EQ(ok.answered, 1);
+    EXPECT_TRUE(said.contains("is not a quote database")) << said.toStdString();
+    EXPECT_TRUE(said.contains("The quotes of other.db are still shown")) << said.toStdString();
+    EXPECT_EQ(window.Store().Path(), otherPath);
+    EXPECT_EQ(window.QuoteList()->rowCount(), 4);
+    EXPECT_EQ(window.CurrentQuote(), "Q1003");
+  }
+  EXPECT_EQ(bytes(catalogue), catalogueBytes);
+}
+
+TEST_F(QuoteHostTest, TheMenusOpenTheKeysTheAboutBoxAndQuit) {
+  quote::QuoteWindow window(store);
+  ShowActive(window);
+  QStringList said;
+  Answer ok([&said](QWidget* modal) {
+    auto* box = qobject_cast<QMessageBox*>(modal);
+    if (!box) return false;
+    said << box->windowTitle() + ": " + box->text();
+    box->accept();
+    return true;
+  });
+  QTest::keyClick(&window, Qt::Key_F1);
+  window.AboutAction()->trigger();
+  ASSERT_EQ(said.size(), 2);
+  EXPECT_TRUE(said[0].startsWith("Keys: ") && said[0].contains("<b>Enter</b>"))
+      << said[0].toStdString();
+  EXPECT_TRUE(said[1].contains(QRegularExpression("Belvane Quote</b> \\d+\\.\\d+\\.\\d+")))
+      << said[1].toStdString();
+
+  window.activateWindow(); // back from the boxes
+  ASSERT_TRUE(QTest::qWaitForWindowActive(&window));
+  QTest::keyClick(&window, Qt::Key_Q, Qt::ControlModifier);
+  EXPECT_FALSE(window.isVisible());
 }
