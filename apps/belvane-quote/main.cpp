@@ -115,6 +115,9 @@ int main(int argc, char** argv) {
     forms::ScopedRuntime use(runtime);
     quote::QuoteWindow window(store);
     if (demo) return quote::RunScriptedDemo(window, runtime, screenshots, std::cout);
+    // The editors open as large, and where, the estimator last left them
+    // (the scripted session keeps the design's size, for its pictures).
+    runtime.RememberWindowPlaces(qt::QtRuntime::DefaultWindowPlacesFile());
     window.show();
     return QApplication::exec();
   } catch (const Error& e) {

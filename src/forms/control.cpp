@@ -69,8 +69,7 @@ char32_t Control::AccessKey() const {
 
 void Control::AccessKey(char32_t key) {
   const char32_t normal = KeyOf(key);
-  if (key != 0 && normal == 0)
-    throw Error(grid::kInvalidPropertyValue, "Invalid property value");
+  if (key != 0 && normal == 0) throw Error(grid::kInvalidPropertyValue, "Invalid property value");
   accessKey_ = normal;
 }
 

@@ -119,6 +119,15 @@ bool Input::AccessKeyDown(Form& form, int keyCode) {
     for (++it; it != order.end(); ++it) {
       Control* next = *it;
       if (!next->TabStop() || !next->CanTakeFocus()) continue;
+      // A control shown over it in the same place (a list of results laid
+      // over the list it stands for) is the one the user sees.
+      const auto& place = next->Model();
+      for (Control* c : order)
+        if (c != next && c->Container() == next->Container() && c->TabStop() && c->CanTakeFocus() &&
+            c->Model().Left() == place.Left() && c->Model().Top() == place.Top() &&
+            c->Model().Width() == place.Width() && c->Model().Height() == place.Height() &&
+            c->Model().ZOrderKey() > next->Model().ZOrderKey())
+          next = c;
       Step(*next, "GotFocus", [&] { form.MoveFocus(next); });
       if (form.ActiveControl() == next) Step(*next, "GotFocus", [&] { next->TabbedInto(); });
       break;

@@ -182,7 +182,8 @@ void FormWindow::TakeWindowSize() {
   const int strip = StripHeight();
   const int height = std::max(0, this->height() - strip);
   if (totals_) totals_->setGeometry(0, height, width(), strip);
-  if (scale_.Pixels(form_->ScaleWidth()) == width() && scale_.Pixels(form_->ScaleHeight()) == height)
+  if (scale_.Pixels(form_->ScaleWidth()) == width() &&
+      scale_.Pixels(form_->ScaleHeight()) == height)
     return;
   resizing_ = true;
   forms::Input::Resize(*form_, scale_.Twips(width()), scale_.Twips(height));

@@ -9,12 +9,12 @@
 
 #include <QAbstractButton>
 #include <QApplication>
-#include <QStandardPaths>
 #include <QCursor>
 #include <QGuiApplication>
 #include <QMessageBox>
 #include <QPointer>
 #include <QPushButton>
+#include <QStandardPaths>
 #include <QThread>
 #include <QTimer>
 

@@ -7,6 +7,8 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+
 using namespace belvane::forms;
 using belvane::forms::testing::ProbeForm;
 using Log = std::vector<std::string>;
@@ -258,4 +260,86 @@ TEST_F(InputEvents, AHandlerErrorEndsOnlyThatHandler) {
   form.cmdOk.OnClick = [] { throw belvane::Error(5, "x"); };
   form.chkFlag.OnClick = [this] { form.cmdOk.OnClick(); };
   EXPECT_EQ(ErrorNumber([&] { form.chkFlag.Value(kChecked); }), 5);
+}
+
+// ---- access keys, the form's key preview, resizing ----
+
+TEST_F(InputEvents, AltAndAnAccessKeyWorksItsControlBeforeTheFocusedControlSeesTheKey) {
+  form.cmdOk.Caption("&Ok");   // marked in the caption
+  form.chkFlag.AccessKey('f'); // given by the form, any case
+  form.optKind(2).Caption("Kind &3");
+  form.lblInfo.Caption("&Info && more");
+  EXPECT_EQ(form.cmdOk.AccessKey(), U'O');
+  EXPECT_EQ(form.chkFlag.AccessKey(), U'F');
+  EXPECT_EQ(form.lblInfo.AccessKey(), U'I');
+  form.log.clear();
+
+  user.PressKey('O', kAltMask);
+  EXPECT_TRUE(form.cmdOk.HasFocus());
+  EXPECT_EQ(std::count(form.log.begin(), form.log.end(), "cmdOk_Click"), 1);
+  EXPECT_EQ(std::count(form.log.begin(), form.log.end(), "txtA_KeyDown(79)"), 0);
+  user.PressKey('F', kAltMask);
+  EXPECT_EQ(form.chkFlag.Value(), kChecked);
+  user.PressKey('3', kAltMask);
+  EXPECT_TRUE(form.optKind(2).Value());
+  // A label passes the focus on to the next control in the tab order.
+  user.PressKey('I', kAltMask);
+  EXPECT_TRUE(form.cmdOk.HasFocus());
+
+  // A disabled control's key, or a key no control has, goes to the focused
+  // control, and Alt types nothing.
+  form.txtA.SetFocus();
+  form.chkFlag.Enabled(false);
+  form.log.clear();
+  user.PressKey('F', kAltMask);
+  user.PressKey('Z', kAltMask);
+  EXPECT_EQ(form.chkFlag.Value(), kChecked);
+  EXPECT_EQ(form.log,
+            (Log{"txtA_KeyDown(70)", "txtA_KeyUp(70)", "txtA_KeyDown(90)", "txtA_KeyUp(90)"}));
+  EXPECT_EQ(form.txtA.Text(), "");
+  EXPECT_THROW(form.cmdOk.AccessKey(U'-'), belvane::Error);
+}
+
+namespace {
+
+class WatchingForm : public ProbeForm {
+public:
+  int resized = 0;
+  std::vector<int> previewed;
+
+protected:
+  void Form_KeyDown(int& keyCode, int) override {
+    previewed.push_back(keyCode);
+    if (keyCode == keys::kF1) keyCode = 0;
+  }
+  void Form_Resize() override { ++resized; }
+};
+
+} // namespace
+
+TEST(FormHooks, KeyPreviewSeesKeysFirstAndResizeOnlyReachesASizableLoadedForm) {
+  ThreadHeadlessRuntime().Reset();
+  WatchingForm form;
+  SimulatedUser user;
+  EXPECT_FALSE(user.Resize(form, 6000, 4000)); // not loaded
+  form.Show();
+  user.PressKey(keys::kF1);
+  EXPECT_TRUE(form.previewed.empty()) << "KeyPreview is off";
+
+  form.KeyPreview(true);
+  form.log.clear();
+  user.PressKey(keys::kF1); // consumed by the form
+  user.Type("x");           // seen by the form, then typed
+  EXPECT_EQ(form.previewed, (std::vector<int>{keys::kF1, 'X'}));
+  EXPECT_EQ(form.txtA.Text(), "x");
+
+  EXPECT_FALSE(user.Resize(form, 6000, 4000)); // not sizable
+  EXPECT_EQ(form.resized, 0);
+  form.Sizable(true);
+  ASSERT_TRUE(user.Resize(form, 6000, 4000));
+  EXPECT_EQ(form.resized, 1);
+  EXPECT_EQ(form.ScaleWidth(), 6000);
+  EXPECT_EQ(form.ScaleHeight(), 4000);
+  form.Unload();
+  EXPECT_TRUE(form.Sizable()) << "part of the form's make";
 }
