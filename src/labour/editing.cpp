@@ -287,13 +287,7 @@ void frmLabour::FGSelectedLabour_KeyDown(int& keyCode, int shift) {
   grid::FlexGrid& g = FGSelectedLabour;
   const int r = g.Row();
   const int c = g.Col();
-  if (meMode != eEdit) return;
-  if (shift & forms::kCtrlMask) {
-    // Ctrl+Z takes back the last deletion, Ctrl+Y does it again.
-    if (keyCode == 'Z') UndoDeletion();
-    if (keyCode == 'Y') RedoDeletion();
-    return;
-  }
+  if (meMode != eEdit || (shift & forms::kCtrlMask)) return;
   if (keyCode != keys::kF2) return;
   if (r < 1 || c > col::kMechanical || IsGrey(g, r, c) || IsFlagColumn(c)) return;
   OpenCellEditor(IsHoursColumn(c));

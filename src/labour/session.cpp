@@ -385,9 +385,20 @@ void frmLabour::Form_Resize() {
 }
 
 void frmLabour::Form_KeyDown(int& keyCode, int shift) {
-  if (keyCode != forms::keys::kF1 || shift != 0) return;
+  if (keyCode == forms::keys::kF1 && shift == 0) {
+    keyCode = 0;
+    cmdHelp_Click();
+    return;
+  }
+  // Ctrl+Z takes back the last deletion, Ctrl+Y does it again, wherever
+  // the focus is but in a text box.
+  if (shift != forms::kCtrlMask || (keyCode != 'Z' && keyCode != 'Y') || meMode != eEdit) return;
+  if (ActiveControl() && ActiveControl()->Kind() == forms::ControlKind::TextBox) return;
+  if (keyCode == 'Z')
+    UndoDeletion();
+  else
+    RedoDeletion();
   keyCode = 0;
-  cmdHelp_Click();
 }
 
 void frmLabour::cmdHelp_Click() {

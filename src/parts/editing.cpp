@@ -312,12 +312,7 @@ void frmParts::FGSelectedParts_DblClick() {
 
 void frmParts::FGSelectedParts_KeyDown(int& keyCode, int shift) {
   grid::FlexGrid& g = FGSelectedParts;
-  if (meMode == eEdit && (shift & forms::kCtrlMask)) {
-    // Ctrl+Z takes back the last deletion, Ctrl+Y does it again.
-    if (keyCode == 'Z') UndoDeletion();
-    if (keyCode == 'Y') RedoDeletion();
-    return;
-  }
+  if (shift & forms::kCtrlMask) return;
   if (meMode != eEdit || keyCode != keys::kF2 || g.Row() < 1 || !IsEditable(g.Col())) return;
   OpenCellEditor(false);
   if (g.Col() == sel::kType) DropPartTypeList(text::Trim(T1.Text()));

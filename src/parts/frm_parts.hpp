@@ -130,7 +130,8 @@ public:
 protected:
   void Design() override;
   void Form_Load() override;
-  // F1 anywhere in the window: the key reference.
+  // F1 anywhere in the window: the key reference; Ctrl+Z and Ctrl+Y
+  // (but in a text box): take back a deletion, or do it again.
   void Form_KeyDown(int& keyCode, int shift) override;
   // A larger window gives its room to the grids (the descriptions widen).
   void Form_Resize() override;

@@ -203,6 +203,9 @@ void FormWindow::ApplyFont() {
 // the window it belongs to, or on the screen.
 void FormWindow::Place() {
   if (!form_) return;
+  // The totals strip as the loaded form has it, before the window takes
+  // its size.
+  RefreshTotals();
   // A sizable window opens where, and as large as, it was last closed.
   if (RestorePlace()) {
     placed_ = true;

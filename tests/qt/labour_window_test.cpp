@@ -13,8 +13,10 @@
 #include <QMessageBox>
 #include <QPushButton>
 #include <QRadioButton>
+#include <QTemporaryDir>
 #include <QTest>
 
+#include <cstdlib>
 #include <map>
 #include <optional>
 
@@ -59,6 +61,17 @@ protected:
   QtRuntime& InputRuntime() override { return *qt_; }
   QString Shown(const forms::FlexGrid& g, int row, int col) {
     return GridOf(g)->Table()->model()->index(row - 1, col).data().toString();
+  }
+
+  // Pictures for the documentation, with BELVANE_SCREENSHOTS set to a folder.
+  static void PictureOf(QWidget& window, const char* name) {
+    const char* folder = std::getenv("BELVANE_SCREENSHOTS");
+    if (!folder || !*folder) return;
+    QApplication::processEvents();
+    EXPECT_TRUE(WindowPicture(window).save(QString::fromUtf8(folder) + "/" + name));
+  }
+  void Picture(const labour::frmLabour& form, const char* name) {
+    PictureOf(*qt_->Window(form), name);
   }
 
   QLineEdit* Editor(const labour::frmLabour& form) {
@@ -244,5 +257,126 @@ TEST_F(LabourWindowTest, TheTotalsStripFollowsTypedHours) {
               GridOf(form.FGSelectedLabour)->Widget()->window()->height() - strip->height());
     Key(Qt::Key_Return);
     Click(form.cmdClose);
+  });
+}
+
+// The whole road of an edit without the mouse: find an item, add it, type
+// its hours, delete a line, take the deletion back and do it again, close.
+TEST_F(LabourWindowTest, TheWholeEditByKeyboardAlone) {
+  AddRecord(1, "120", "L/H FRONT GUARD", "R&R", 1.0);
+  AddRecord(2, "140", "Roof panel", "R&R", 3.0);
+  Stored();
+  std::string added;
+  OpenWindow(eEdit, [&](labour::frmLabour& form) {
+    auto& sel = form.FGSelectedLabour;
+    Key(Qt::Key_S, Qt::AltModifier);
+    EXPECT_TRUE(Qt().Widget(form.txtSearch)->hasFocus());
+    Type("BUMPER");
+    Key(Qt::Key_Return);
+    ASSERT_TRUE(Qt().Widget(form.fgSearch)->isVisible());
+    Key(Qt::Key_A, Qt::AltModifier);
+    ASSERT_TRUE(GridOf(form.fgSearch)->Table()->hasFocus());
+    Key(Qt::Key_Return); // the first result, every operation of it
+    ASSERT_EQ(sel.Rows(), 4);
+    added = sel.TextMatrix(3, col::kItemNo);
+    EXPECT_EQ(added, form.fgSearch.TextMatrix(1, 0));
+    ASSERT_TRUE(Editor(form)->hasFocus()); // the editor opened on the new line
+    Key(Qt::Key_Escape);
+    // To its R&R hours by the arrows, and type them.
+    for (int i = 0; i < 12 && sel.Col() > col::kRRHours; ++i)
+      Key(Qt::Key_Left);
+    for (int i = 0; i < 12 && sel.Col() < col::kRRHours; ++i)
+      Key(Qt::Key_Right);
+    ASSERT_EQ(sel.Col(), col::kRRHours);
+    Type("2.5");
+    Key(Qt::Key_Return);
+    EXPECT_EQ(sel.TextMatrix(3, col::kRRHours), "2.50");
+
+    // The roof panel's line: Alt+E, Up, Alt+D deletes it; Ctrl+Z brings it
+    // back; Ctrl+Y deletes it again.
+    Key(Qt::Key_E, Qt::AltModifier);
+    EXPECT_TRUE(GridOf(sel)->Table()->hasFocus());
+    Key(Qt::Key_Up);
+    ASSERT_EQ(sel.TextMatrix(sel.Row(), col::kItemNo), "140");
+    Key(Qt::Key_D, Qt::AltModifier);
+    EXPECT_EQ(sel.Rows(), 3);
+    Key(Qt::Key_Z, Qt::ControlModifier);
+    ASSERT_EQ(sel.Rows(), 4);
+    EXPECT_EQ(sel.TextMatrix(2, col::kItemNo), "140");
+    Key(Qt::Key_Y, Qt::ControlModifier);
+    EXPECT_EQ(sel.Rows(), 3);
+    Key(Qt::Key_C, Qt::AltModifier);
+  });
+  EXPECT_FALSE(host::gbLabourFormLoaded);
+  const std::vector<std::string> records = Records();
+  EXPECT_NE(std::find(records.begin(), records.end(), "120 R&R 1"), records.end());
+  EXPECT_NE(std::find(records.begin(), records.end(), added + " R&R 2.5"), records.end())
+      << "the typed hours are stored";
+  for (const std::string& r : records)
+    EXPECT_EQ(r.rfind("140 ", 0), std::string::npos) << r;
+}
+
+// A larger window: the description columns take the extra width, the other
+// columns keep theirs, the buttons keep to the corner; F1 shows the keys;
+// the window opens again as large as it was closed.
+TEST_F(LabourWindowTest, TheWindowGrowsIntoTheDescriptionsAndRemembersItsSize) {
+  AddRecord(1, "120", "L/H FRONT GUARD", "R&R", 1.0);
+  AddRecord(2, "120", "L/H FRONT GUARD", "PAINT", 2.0);
+  Stored();
+  QTemporaryDir folder;
+  ASSERT_TRUE(folder.isValid());
+  Qt().RememberWindowPlaces(folder.filePath("windows.ini").toStdString());
+  QSize closedAt;
+  OpenWindow(eEdit, [&](labour::frmLabour& form) {
+    QWidget* window = Qt().Window(form);
+    auto& sel = form.FGSelectedLabour;
+    const QSize design = window->size();
+    const int description = GridOf(sel)->CellRect(1, col::kDescription).width();
+    const int hours = GridOf(sel)->CellRect(1, col::kRRHours).width();
+    const QPoint close = Qt().Widget(form.cmdClose)->pos();
+
+    window->resize(design + QSize(300, 120));
+    QApplication::processEvents();
+    EXPECT_EQ(GridOf(sel)->CellRect(1, col::kDescription).width(), description + 300);
+    EXPECT_EQ(GridOf(sel)->CellRect(1, col::kRRHours).width(), hours);
+    EXPECT_EQ(Qt().Widget(form.cmdClose)->pos(), close + QPoint(300, 120));
+    auto* strip = window->findChild<QLabel*>("RunningTotals");
+    ASSERT_NE(strip, nullptr);
+    EXPECT_EQ(strip->geometry().bottom(), window->height() - 1);
+    EXPECT_EQ(strip->width(), window->width());
+
+    // Never smaller than the design.
+    window->resize(design - QSize(200, 200));
+    QApplication::processEvents();
+    EXPECT_EQ(window->size(), design);
+    EXPECT_EQ(GridOf(sel)->CellRect(1, col::kDescription).width(), description);
+
+    window->showMaximized();
+    QTest::qWait(50);
+    EXPECT_GT(GridOf(sel)->CellRect(1, col::kDescription).width(), description);
+    Picture(form, "labour-maximised.png");
+
+    QString help;
+    Qt().QueueMessageBox([&](QMessageBox& box) {
+      help = box.windowTitle() + "\n" + box.text();
+      PictureOf(box, "labour-help.png");
+      QTest::keyClick(&box, Qt::Key_Return);
+    });
+    Key(Qt::Key_F1);
+    EXPECT_TRUE(help.startsWith("Labour editor keys\n")) << help.toStdString();
+    EXPECT_TRUE(help.contains("Enter or Insert")) << help.toStdString();
+
+    window->showNormal();
+    window->activateWindow(); // the offscreen platform leaves none active
+    ASSERT_TRUE(QTest::qWaitForWindowActive(window));
+    window->resize(design + QSize(100, 50));
+    QApplication::processEvents();
+    closedAt = window->size();
+    Key(Qt::Key_C, Qt::AltModifier);
+  });
+  OpenWindow(eView, [&](labour::frmLabour& form) {
+    EXPECT_EQ(Qt().Window(form)->size(), closedAt);
+    EXPECT_EQ(form.ScaleWidth(), 10710 + Qt().GetScale().Twips(100));
+    Key(Qt::Key_C, Qt::AltModifier);
   });
 }

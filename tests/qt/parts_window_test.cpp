@@ -102,12 +102,12 @@ protected:
     return QRect(view->Widget()->mapTo(view->Widget()->window(), cell.topLeft()), cell.size());
   }
 
-  void Picture(const frmParts& form, const char* name) {
+  void Picture(const frmParts& form, const char* name) { Picture(*qt_->Window(form), name); }
+  static void Picture(QWidget& window, const char* name) {
     const char* folder = std::getenv("BELVANE_SCREENSHOTS");
     if (!folder || !*folder) return;
-    QWidget* window = qt_->Window(form);
     QApplication::processEvents();
-    EXPECT_TRUE(WindowPicture(*window).save(QString::fromUtf8(folder) + "/" + name));
+    EXPECT_TRUE(WindowPicture(window).save(QString::fromUtf8(folder) + "/" + name));
   }
 
 private:
@@ -359,3 +359,70 @@ TEST_F(PartsWindowTest, NoClosesTheWindowWithoutWriting) {
 }
 
 } // namespace
+
+// The whole road of a parts edit without the mouse: search, add a result
+// with Enter, price it, pick its type from the list, tick "Rpt", delete a
+// part and take the deletion back, close; F1 shows the keys.
+TEST_F(PartsWindowTest, TheWholeEditByKeyboardAlone) {
+  TwoParts();
+  const std::vector<std::string> before = Records();
+  OpenWindow(eEdit, [&](frmParts& form) {
+    auto& g = form.FGSelectedParts;
+    Key(Qt::Key_S, Qt::AltModifier);
+    EXPECT_TRUE(Qt().Widget(form.txtSearch)->hasFocus());
+    Type("bumper");
+    Key(Qt::Key_Return);
+    ASSERT_TRUE(Qt().Widget(form.fgSearch)->isVisible());
+    Key(Qt::Key_A, Qt::AltModifier);
+    ASSERT_TRUE(GridOf(form.fgSearch)->Table()->hasFocus());
+    Key(Qt::Key_Down);
+    ASSERT_EQ(form.fgSearch.TextMatrix(form.fgSearch.Row(), cat::kItemNo), "P120");
+    Key(Qt::Key_Return); // added; the editor opens on its unit price
+    ASSERT_EQ(g.Rows(), 4);
+    ASSERT_TRUE(Editor(form)->hasFocus());
+    Type("100");
+    Key(Qt::Key_Return);
+    EXPECT_EQ(Shown(g, 3, sel::kUnitPrice), "100.00");
+    // Back to the type column; F2 drops the list; Down twice and Enter.
+    for (int i = 0; i < 12 && g.Col() > sel::kType; ++i)
+      Key(Qt::Key_Left);
+    ASSERT_EQ(g.Col(), sel::kType);
+    Key(Qt::Key_F2);
+    ASSERT_TRUE(Qt().Widget(form.LV1)->isVisible());
+    Type("x");
+    EXPECT_EQ(Shown(g, 3, sel::kType), "X");
+    Key(Qt::Key_Return);
+    for (int i = 0; i < 12 && g.Col() < sel::kReport; ++i)
+      Key(Qt::Key_Right);
+    ASSERT_EQ(g.Col(), sel::kReport);
+    Key(Qt::Key_Space);
+
+    // The headlamp: up to it, Alt+D, Ctrl+Z brings it back, Alt+C closes.
+    Key(Qt::Key_E, Qt::AltModifier);
+    Key(Qt::Key_Up);
+    ASSERT_EQ(g.TextMatrix(g.Row(), sel::kItemNo), "P140");
+    Key(Qt::Key_D, Qt::AltModifier);
+    EXPECT_EQ(g.Rows(), 3);
+    Key(Qt::Key_Z, Qt::ControlModifier);
+    EXPECT_EQ(g.Rows(), 4);
+
+    QString help;
+    Qt().QueueMessageBox([&](QMessageBox& box) {
+      help = box.windowTitle();
+      Picture(box, "parts-help.png");
+      QTest::keyClick(&box, Qt::Key_Return);
+    });
+    Key(Qt::Key_F1);
+    EXPECT_EQ(help, "Parts editor keys");
+    QWidget* window = Qt().Window(form);
+    window->activateWindow(); // the offscreen platform leaves none active
+    ASSERT_TRUE(QTest::qWaitForWindowActive(window));
+    Key(Qt::Key_C, Qt::AltModifier);
+  });
+  EXPECT_FALSE(host::gbPartsFormLoaded);
+  ASSERT_EQ(Records(), (std::vector<std::string>{
+                           before[0],
+                           "P120|REAR BUMPER COVER|o|X|2|100|120||1|<Null>|1",
+                           before[1],
+                       }));
+}

@@ -32,10 +32,12 @@ protected:
     return dynamic_cast<GridView*>(InputRuntime().View(grid));
   }
 
-  // Keys go to whatever widget Qt gives the keyboard, as a person's do.
+  // Keys go to whatever widget Qt gives the keyboard, as a person's do: the
+  // focused widget, else the active window.
   static void Key(Qt::Key key, Qt::KeyboardModifiers modifiers = Qt::NoModifier) {
     QWidget* focused = QApplication::focusWidget();
-    ASSERT_NE(focused, nullptr) << "no widget has the keyboard focus";
+    if (!focused) focused = QApplication::activeWindow();
+    ASSERT_NE(focused, nullptr) << "no window has the keyboard";
     QTest::keyClick(focused, key, modifiers);
   }
   // Each character to the widget that has the focus when it is typed.
