@@ -8,13 +8,13 @@ namespace belvane::editor {
 
 namespace {
 constexpr std::string_view kWindowKeys =
-    "In every part of the window\r\n"
-    "  Tab, Shift+Tab: the next or previous control.\r\n"
-    "  Alt and an underlined letter: that button, option or list.\r\n"
-    "  Ctrl+Z: takes back the last deletion; Ctrl+Y: deletes it again.\r\n"
-    "  F1 or Help: these keys.\r\n"
-    "  Close (Alt+C): keeps the lines. The window's close box asks first.\r\n"
-    "The window can be made larger or maximised; it remembers its size.";
+    "ANYWHERE IN THE WINDOW\r\n"
+    "Tab, Shift+Tab: the next or previous control.\r\n"
+    "Alt and an underlined letter: that button, option or list.\r\n"
+    "Ctrl+Z: takes back the last deletion; Ctrl+Y: deletes it again.\r\n"
+    "F1 or Alt+H: these keys.\r\n"
+    "Alt+C: Close, keeping the changes; the window's close box asks.\r\n"
+    "The window can be made larger or maximised.";
 } // namespace
 
 void ShowKeysHelp(std::string_view title, std::string_view editorLines) {

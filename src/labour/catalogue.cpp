@@ -78,6 +78,8 @@ void frmLabour::LoadScheduleItems(long scheduleNo, const std::string& firstId,
     if (g.Rows() > 11)
       g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - editor::kRowStepTwips);
     if (g.Rows() > 2) g.RemoveItem(1);
+    // The list opens at its first item, where the keyboard starts.
+    if (g.Rows() > 1) g.Row(1);
   }
   if (rs->State() == data::adStateOpen) rs->Close();
 }
@@ -227,6 +229,7 @@ void frmLabour::SearchLabourItems() {
     return;
   }
   fgSearch.RemoveItem(1);
+  fgSearch.Row(1); // the first result, where the keyboard starts
   if (fgSearch.Rows() >= 11)
     fgSearch.ColWidth(col::kDescription,
                       fgSearch.ColWidth(col::kDescription) - editor::kRowStepTwips);

@@ -402,21 +402,22 @@ void frmLabour::Form_KeyDown(int& keyCode, int shift) {
 }
 
 void frmLabour::cmdHelp_Click() {
-  editor::ShowKeysHelp(
-      "Labour editor keys",
-      "Finding labour\r\n"
-      "  Alt+S: type words in \"Search for\", then Enter; Browse (Alt+B) shows the schedule "
-      "again.\r\n"
-      "  Alt+N, Alt+M, Alt+3, Alt+P: the NRMA, MTA, 3RD and NRMA CP schedules.\r\n"
-      "  Alt+A: the list of available items; arrows and Page Up/Down move in it.\r\n"
-      "  Enter or Insert, or a double click on the description: adds the whole item.\r\n"
-      "  A double click on an R&R, Repair or Paint figure: adds only that operation.\r\n"
-      "\r\n"
-      "Editing the selected lines (Alt+E)\r\n"
-      "  Arrows move; typing replaces the cell; F2 or a double click edits it.\r\n"
-      "  Enter keeps the text and moves on; Escape takes the cell back.\r\n"
-      "  Space or a double click ticks or clears a flag.\r\n"
-      "  Delete (Alt+D): removes the current line.");
+  editor::ShowKeysHelp("Labour editor keys",
+                       "FINDING LABOUR\r\n"
+                       "Alt+S: search; type words, then Enter.\r\n"
+                       "Alt+B: browse the schedule again.\r\n"
+                       "Alt+N, Alt+M, Alt+3, Alt+P: the NRMA, MTA, 3RD, NRMA CP schedules.\r\n"
+                       "Alt+A: the available items; arrows, Page Up and Down move.\r\n"
+                       "Enter or Insert: adds the whole item (as a double click on\r\n"
+                       "its description); a double click on an R&R, Repair or Paint\r\n"
+                       "figure adds only that operation.\r\n"
+                       "\r\n"
+                       "EDITING THE SELECTED LINES\r\n"
+                       "Alt+E: the selected lines; arrows move.\r\n"
+                       "Typing replaces a cell; F2 or a double click edits it.\r\n"
+                       "Enter keeps the text and moves on; Escape takes it back.\r\n"
+                       "Space or a double click ticks or clears a flag.\r\n"
+                       "Alt+D: deletes the current line.");
 }
 
 void frmLabour::cmdClose_Click() {

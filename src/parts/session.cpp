@@ -350,21 +350,21 @@ void frmParts::Form_KeyDown(int& keyCode, int shift) {
 }
 
 void frmParts::cmdHelp_Click() {
-  editor::ShowKeysHelp(
-      "Parts editor keys",
-      "Finding parts\r\n"
-      "  Alt+S: type words in \"Search for\", then Enter.\r\n"
-      "  Alt+G: find the parts of a panel group on the vehicle diagram.\r\n"
-      "  Alt+B: browse every available part again.\r\n"
-      "  Alt+A: the list of available parts; arrows and Page Up/Down move in it.\r\n"
-      "  Enter or Insert, or a double click: adds the part.\r\n"
-      "\r\n"
-      "Editing the selected parts (Alt+E)\r\n"
-      "  Arrows move; typing replaces the cell; F2 or a double click edits it.\r\n"
-      "  Enter keeps the text and moves on; Escape takes the cell back.\r\n"
-      "  In the type column, F2 opens the list of part types; arrows and Enter pick one.\r\n"
-      "  Space or a double click ticks or clears \"Report Only\".\r\n"
-      "  Delete (Alt+D): removes the current part.");
+  editor::ShowKeysHelp("Parts editor keys",
+                       "FINDING PARTS\r\n"
+                       "Alt+S: search; type words, then Enter.\r\n"
+                       "Alt+G: the parts of a panel group, picked on the vehicle diagram.\r\n"
+                       "Alt+B: browse every available part again.\r\n"
+                       "Alt+A: the available parts; arrows, Page Up and Down move.\r\n"
+                       "Enter or Insert, or a double click: adds the part.\r\n"
+                       "\r\n"
+                       "EDITING THE SELECTED PARTS\r\n"
+                       "Alt+E: the selected parts; arrows move.\r\n"
+                       "Typing replaces a cell; F2 or a double click edits it.\r\n"
+                       "Enter keeps the text and moves on; Escape takes it back.\r\n"
+                       "Part type: F2 opens the list; a letter, or arrows and Enter, pick.\r\n"
+                       "Space or a double click ticks or clears Rpt (report only).\r\n"
+                       "Alt+D: deletes the current part.");
 }
 
 void frmParts::cmdClose_Click() {

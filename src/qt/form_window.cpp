@@ -69,9 +69,6 @@ FormWindow::FormWindow(QtRuntime& runtime, forms::Form& form, const Scale& scale
   setFocusPolicy(Qt::NoFocus);
   setContextMenuPolicy(Qt::NoContextMenu);
   setSizeGripEnabled(form.Sizable());
-  // The style draws the focus frame on the control that has the keyboard,
-  // as after a Tab: the focus here always follows the keyboard's work.
-  setAttribute(Qt::WA_KeyboardFocusChange);
   installEventFilter(this);
   for (forms::Control* control : form.Controls())
     MakeView(*control);
@@ -275,6 +272,13 @@ void FormWindow::FollowFocus() {
   QWidget* widget = active ? WidgetOf(*active) : nullptr;
   if (widget && widget->isEnabled() && !widget->isHidden()) {
     if (!widget->hasFocus()) widget->setFocus(Qt::OtherFocusReason);
+    // The style draws its focus frame only after keyboard focus changes;
+    // here the focus always moves as the keyboard's work (the forms move
+    // it, whatever the input), so the frame always shows.
+    if (!testAttribute(Qt::WA_KeyboardFocusChange)) {
+      setAttribute(Qt::WA_KeyboardFocusChange);
+      widget->update();
+    }
     return;
   }
   const QWidget* focused = focusWidget();

@@ -260,6 +260,28 @@ void GridTable::updateGeometries() {
   if (onGeometries) onGeometries();
 }
 
+// The focus frame round the cells of a grid that has the keyboard, in the
+// style's highlight colour as its focus frames on buttons are: drawn over
+// the table's edge, letting the mouse through.
+class GridFocusFrame : public QWidget {
+public:
+  explicit GridFocusFrame(QWidget* parent) : QWidget(parent) {
+    setAttribute(Qt::WA_TransparentForMouseEvents);
+    setFocusPolicy(Qt::NoFocus);
+  }
+
+protected:
+  void paintEvent(QPaintEvent*) override {
+    QPainter painter(this);
+    QPen pen(palette().color(QPalette::Highlight));
+    pen.setWidth(2);
+    pen.setJoinStyle(Qt::MiterJoin);
+    painter.setPen(pen);
+    painter.setBrush(Qt::NoBrush);
+    painter.drawRect(QRectF(rect()).adjusted(1, 1, -1, -1));
+  }
+};
+
 // ---- GridView ----
 
 GridView::GridView(FormWindow& window, forms::FlexGrid& grid, QWidget* parent)
@@ -312,6 +334,8 @@ GridView::GridView(FormWindow& window, forms::FlexGrid& grid, QWidget* parent)
   corner_ = new QWidget(frame);
   corner_->setAutoFillBackground(true);
   corner_->hide();
+  focusFrame_ = new GridFocusFrame(frame);
+  focusFrame_->hide();
 
   Watch(table_);
   Watch(table_->viewport());
@@ -405,6 +429,7 @@ void GridView::LayOut() {
   vbar_->setVisible(vertical);
   hbar_->setVisible(horizontal);
   corner_->setVisible(vertical && horizontal);
+  focusFrame_->setGeometry(0, 0, next.tableWidth, next.tableHeight);
 }
 
 // The table's offsets and the bars' values from the model's TopRow and
@@ -588,7 +613,10 @@ void GridView::CurrentCellChanged(int, int) {
 
 void GridView::FocusChanged(bool hasFocus) {
   ControlView::FocusChanged(hasFocus);
-  if (Alive()) table_->viewport()->update();
+  if (!Alive()) return;
+  table_->viewport()->update();
+  focusFrame_->setVisible(hasFocus);
+  if (hasFocus) focusFrame_->raise();
 }
 
 // The grid is going (its form is being destroyed): nothing reads it from

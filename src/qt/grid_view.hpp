@@ -141,6 +141,7 @@ private:
   QScrollBar* vbar_ = nullptr;
   QScrollBar* hbar_ = nullptr;
   QWidget* corner_ = nullptr;
+  QWidget* focusFrame_ = nullptr; // over the cells while the grid has the focus
   Layout layout_;
   bool uniformRows_ = true; // every data row of the standard height
   bool syncingScroll_ = false;

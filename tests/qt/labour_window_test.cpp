@@ -380,3 +380,21 @@ TEST_F(LabourWindowTest, TheWindowGrowsIntoTheDescriptionsAndRemembersItsSize) {
     Key(Qt::Key_C, Qt::AltModifier);
   });
 }
+
+// The control with the keyboard shows it: the style's focus frame on a
+// button, the check box, an option button and round a grid's cells.
+TEST_F(LabourWindowTest, TheFocusedControlShowsTheFocusFrame) {
+  OpenWindow(eEdit, [&](labour::frmLabour& form) {
+    for (const forms::Control* control : std::initializer_list<const forms::Control*>{
+             &form.cmdDelete, &form.AutoReturn, &form.optSchedule(1), &form.FGLabourItems(0)}) {
+      QWidget* widget = Qt().Widget(*control);
+      const QImage before = widget->grab().toImage();
+      const_cast<forms::Control*>(control)->SetFocus();
+      QApplication::processEvents();
+      EXPECT_TRUE(widget->hasFocus()) << control->Name();
+      EXPECT_NE(widget->grab().toImage(), before) << control->Name() << " looks the same focused";
+    }
+    form.cmdClose.SetFocus();
+    Key(Qt::Key_Return);
+  });
+}
