@@ -380,9 +380,14 @@ TEST_F(PartsWindowTest, TheWholeEditByKeyboardAlone) {
     Key(Qt::Key_Return); // added; the editor opens on its unit price
     ASSERT_EQ(g.Rows(), 4);
     ASSERT_TRUE(Editor(form)->hasFocus());
+    auto* strip = Qt().Window(form)->findChild<QLabel*>("RunningTotals");
+    ASSERT_NE(strip, nullptr);
+    EXPECT_TRUE(strip->text().startsWith("Parts at cost 700.00")) << strip->text().toStdString();
     Type("100");
     Key(Qt::Key_Return);
     EXPECT_EQ(Shown(g, 3, sel::kUnitPrice), "100.00");
+    QApplication::processEvents();
+    EXPECT_TRUE(strip->text().startsWith("Parts at cost 900.00")) << strip->text().toStdString();
     // Back to the type column; F2 drops the list; Down twice and Enter.
     for (int i = 0; i < 12 && g.Col() > sel::kType; ++i)
       Key(Qt::Key_Left);
