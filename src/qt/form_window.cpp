@@ -142,8 +142,9 @@ void FormWindow::ApplyGeometry() {
   if (!form_) return;
   if (resizing_) return; // the form takes the size the window has
   // A size given by code (the design, at load) is the smallest a sizable
-  // window takes.
-  minimum_ = QSize(scale_.Pixels(form_->ScaleWidth()), scale_.Pixels(form_->ScaleHeight()));
+  // window takes; a move keeps the size the user gave it.
+  const QSize area(scale_.Pixels(form_->ScaleWidth()), scale_.Pixels(form_->ScaleHeight()));
+  if (minimum_.isEmpty() || area != QSize(width(), height() - StripHeight())) minimum_ = area;
   SizeToForm();
   if (placed_ && (form_->Left() != 0 || form_->Top() != 0))
     move(scale_.Pixels(form_->Left()), scale_.Pixels(form_->Top()));
