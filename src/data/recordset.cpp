@@ -27,6 +27,25 @@ std::string FoldName(std::string_view name) { return text::UCase(name); }
 
 bool IsIntegerType(DataType t) { return t == DataType::Integer || t == DataType::SmallInt; }
 
+// Whether a value already has the type a field of `type` holds.
+bool HoldsType(const Value& v, DataType type) {
+  switch (type) {
+  case DataType::SmallInt:
+    return v.Type() == ValueType::Integer;
+  case DataType::Integer:
+    return v.Type() == ValueType::Long;
+  case DataType::Double:
+    return v.Type() == ValueType::Double;
+  case DataType::Boolean:
+    return v.Type() == ValueType::Boolean;
+  case DataType::VarWChar:
+    return v.Type() == ValueType::Text;
+  case DataType::Variant:
+    return true;
+  }
+  return false;
+}
+
 // Evaluates a parsed filter on one record. `leaf` numbers the comparisons
 // in text order; every one is visited so the numbering stays in step. The
 // recursion is as deep as the parentheses nest, which the parser bounds.
@@ -99,6 +118,23 @@ const FieldDef& FieldCollection::Item(size_t index) const {
 }
 
 std::optional<size_t> FieldCollection::IndexOf(std::string_view name) const {
+  // Field names are short ASCII words: fold them on the stack. Anything
+  // else takes the full case mapping.
+  constexpr size_t kShort = 64;
+  if (name.size() <= kShort) {
+    char folded[kShort];
+    bool ascii = true;
+    for (size_t i = 0; i < name.size() && ascii; ++i) {
+      const auto c = static_cast<unsigned char>(name[i]);
+      ascii = c < 0x80;
+      folded[i] = static_cast<char>(c >= 'a' && c <= 'z' ? c - ('a' - 'A') : c);
+    }
+    if (ascii) {
+      auto it = byName_.find(std::string_view(folded, name.size()));
+      if (it == byName_.end()) return std::nullopt;
+      return it->second;
+    }
+  }
   auto it = byName_.find(FoldName(name));
   if (it == byName_.end()) return std::nullopt;
   return it->second;
@@ -287,8 +323,11 @@ void Recordset::AppendLoaded(std::vector<Value> values) {
                     std::to_string(fields_.Count()) + " fields",
                 kSource);
   for (size_t i = 0; i < values.size(); ++i) {
-    if (fields_.defs_[i].type != DataType::Variant && !values[i].IsNull())
-      values[i] = values[i].ConvertTo(fields_.defs_[i].type);
+    // A value of the field's own type (what a store reads, nearly always)
+    // is kept as it is: no copy of its text.
+    const DataType type = fields_.defs_[i].type;
+    if (type != DataType::Variant && !values[i].IsNull() && !HoldsType(values[i], type))
+      values[i] = values[i].ConvertTo(type);
   }
   Record rec;
   rec.values = std::move(values);
@@ -296,8 +335,14 @@ void Recordset::AppendLoaded(std::vector<Value> values) {
   viewPos_.push_back(static_cast<int64_t>(view_.size()));
   view_.push_back(static_cast<uint32_t>(records_.size() - 1));
   ++liveInView_;
-  index_.clear();
+  if (!index_.empty()) index_.clear();
   if (pos_ >= static_cast<long>(view_.size()) - 1 && liveInView_ == 1) pos_ = 0;
+}
+
+void Recordset::ReserveRecords(size_t count) {
+  records_.reserve(count);
+  view_.reserve(count);
+  viewPos_.reserve(count);
 }
 
 void Recordset::Delete(AffectEnum affect) {
@@ -528,6 +573,18 @@ void Recordset::StoredAssign(size_t record, size_t field, const Value& v) {
     throw Error(err::kSubscript, "Subscript out of range", kSource);
   records_[record].values[field] = v.ConvertTo(fields_.defs_[field].type);
   index_.erase(field);
+}
+
+size_t Recordset::CurrentStored() const {
+  Current();
+  return view_[static_cast<size_t>(pos_)];
+}
+
+bool Recordset::MoveToStored(size_t record) {
+  RequireOpen();
+  if (record >= records_.size() || !records_[record].Live() || viewPos_[record] < 0) return false;
+  pos_ = static_cast<long>(viewPos_[record]);
+  return true;
 }
 
 void Recordset::AcceptChanges() {

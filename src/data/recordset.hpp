@@ -12,6 +12,7 @@
 #include "data/value.hpp"
 
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <string>
@@ -58,7 +59,14 @@ private:
   friend class Field;
   Recordset& owner_;
   std::vector<FieldDef> defs_;
-  std::unordered_map<std::string, size_t> byName_; // upper-case name -> index
+  // Upper-case name -> index, looked up by a view without a copy.
+  struct NameHash {
+    using is_transparent = void;
+    size_t operator()(std::string_view s) const noexcept {
+      return std::hash<std::string_view>{}(s);
+    }
+  };
+  std::unordered_map<std::string, size_t, NameHash, std::equal_to<>> byName_;
 };
 
 // A field of the current record.
@@ -145,6 +153,9 @@ public:
   // Values are converted to the field types. Used to fill a record set from
   // a store.
   void AppendLoaded(std::vector<data::Value> values);
+  // Room for `count` records in all, so that a store filling the record set
+  // does not grow it step by step.
+  void ReserveRecords(size_t count);
   // Every record ever held, deleted ones included, in load order.
   size_t StoredCount() const { return records_.size(); }
   RecordStatus StoredStatus(size_t record) const;
@@ -153,6 +164,12 @@ public:
   // Sets a value of a stored record without changing its state (a store
   // writing back the id it assigned).
   void StoredAssign(size_t record, size_t field, const data::Value& v);
+  // The stored index of the current record, and back to it: a caller that
+  // found a record once returns to it without searching again. MoveToStored
+  // returns false, the cursor unchanged, when the record is deleted or not
+  // in the current view.
+  size_t CurrentStored() const;
+  bool MoveToStored(size_t record);
   // Marks the present state as stored: changed and new records become
   // unchanged, deleted ones are dropped. Moves to the first record.
   void AcceptChanges();

@@ -6,32 +6,84 @@
 #include "editor/grid_layout.hpp"
 #include "forms/runtime.hpp"
 #include "labour/frm_labour.hpp"
+#include "text/error.hpp"
 #include "text/number.hpp"
 #include "text/strings.hpp"
 
+#include <charconv>
+#include <cstdint>
+#include <cstring>
 #include <optional>
 #include <string>
+#include <string_view>
+#include <unordered_map>
 
 namespace belvane::labour {
 
 namespace {
 
+// Formats hours with the hours pattern. A schedule repeats a few dozen
+// hours values over thousands of items, so each load keeps the texts it has
+// made.
+class HoursFormatter {
+public:
+  const std::string& operator()(double hours) {
+    uint64_t bits;
+    std::memcpy(&bits, &hours, sizeof bits);
+    auto [it, added] = made_.try_emplace(bits);
+    if (added) it->second = text::FormatNumber(hours, text::kHours);
+    return it->second;
+  }
+
+private:
+  std::unordered_map<uint64_t, std::string> made_;
+};
+
+// The number a deciphered hours text holds: written with "." whatever the
+// reader's locale. Plain digits with one point are read directly; anything
+// else goes through the general reader under that locale.
+std::optional<double> StoredNumber(const std::string& plain) {
+  const char* first = plain.data();
+  const char* last = first + plain.size();
+  bool simple = !plain.empty();
+  int points = 0;
+  for (const char* p = first; p != last && simple; ++p) {
+    if (*p == '.')
+      simple = ++points <= 1;
+    else
+      simple = (*p >= '0' && *p <= '9') || (*p == '-' && p == first && p + 1 != last);
+  }
+  if (simple && plain != "." && plain != "-.") {
+    double n = 0;
+    if (const auto r = std::from_chars(first, last, n); r.ec == std::errc() && r.ptr == last)
+      return n;
+  }
+  text::ScopedNumberLocale stored({".", ","});
+  return text::ParseNumber(plain);
+}
+
 // An hours value of the catalogue: a plain number, or an enciphered one
 // when its text has 16 characters or more.
 // A plain number may be stored as a number or as its text; an enciphered
 // one holds the number written with "." whatever the reader's locale.
-std::string CatalogueHours(const data::Value& v) {
-  if (v.IsNull()) return {};
-  if (v.IsNumber()) return text::FormatNumber(v.ToDouble(), text::kHours);
-  const std::string t = v.ToText();
-  if (t.size() < 16) return text::Format(t, text::kHours);
-  const std::string plain = cipher::DecryptField(t);
-  std::optional<double> n;
-  {
-    text::ScopedNumberLocale stored({".", ","});
-    n = text::ParseNumber(plain);
+void AppendCatalogueHours(std::string& row, const data::Value& v, HoursFormatter& format) {
+  if (v.IsNull()) return;
+  if (v.IsNumber()) {
+    row += format(v.ToDouble());
+    return;
   }
-  return n ? text::FormatNumber(*n, text::kHours) : plain;
+  const std::string* t = v.TextIf();
+  const std::string scratch = t ? std::string() : v.ToText();
+  const std::string& stored = t ? *t : scratch;
+  if (stored.size() < 16) {
+    row += text::Format(stored, text::kHours);
+    return;
+  }
+  const std::string plain = cipher::DecryptField(stored);
+  if (const std::optional<double> n = StoredNumber(plain))
+    row += format(*n);
+  else
+    row += plain;
 }
 
 // The whole-number value of a mask text ("5", " 7"); 0 when it is none.
@@ -44,6 +96,23 @@ void GreyByMask(grid::FlexGrid& g, int row, int mask) {
   if (!(mask & 4)) g.CellBackColorAt(row, 2, grid::kGrey);
   if (!(mask & 2)) g.CellBackColorAt(row, 3, grid::kGrey);
   if (!(mask & 1)) g.CellBackColorAt(row, 4, grid::kGrey);
+}
+
+// The index of a field the schedule query gives; error 3265 names it when
+// the catalogue lacks it.
+size_t FieldIndex(const data::Recordset& rs, const char* name) {
+  if (const auto i = rs.Fields().IndexOf(name)) return *i;
+  throw Error(err::kItemNotFound,
+              std::string("The labour items have no field ") + name +
+                  "; the catalogue must be corrected",
+              "frmLabour.LoadScheduleItems");
+}
+
+// Without the spaces at either end (as Trim).
+std::string_view Trimmed(std::string_view s) {
+  const size_t first = s.find_first_not_of(' ');
+  if (first == std::string_view::npos) return {};
+  return s.substr(first, s.find_last_not_of(' ') - first + 1);
 }
 
 bool Contains(const std::string& haystackUpper, const std::string& needleUpper) {
@@ -63,17 +132,36 @@ void frmLabour::LoadScheduleItems(long scheduleNo, const std::string& firstId,
 
   {
     editor::RedrawSuspended suspended(g);
-    while (!rs->Eof()) {
-      const int mask = rs->Collect("allow_tick").ToInt32();
-      const std::string rr = (mask & 4) ? CatalogueHours(rs->Collect("rrhour")) : std::string();
-      const std::string pt = (mask & 1) ? CatalogueHours(rs->Collect("pthour")) : std::string();
-      g.AddItem(rs->Collect("ItemNo").ToText() + '\t' + text::Trim(rs->Collect("Script").ToText()) +
-                '\t' + rr + "\t\t" + pt + '\t' + std::to_string(mask));
-      const int last = g.Rows() - 1;
-      g.Row(last);
+    const size_t fMask = FieldIndex(*rs, "allow_tick"), fItem = FieldIndex(*rs, "ItemNo"),
+                 fScript = FieldIndex(*rs, "Script"), fRR = FieldIndex(*rs, "rrhour"),
+                 fPT = FieldIndex(*rs, "pthour");
+    HoursFormatter format;
+    std::string row;
+    int last = 0;
+    for (; !rs->Eof(); rs->MoveNext()) {
+      const int mask = rs->Fields(fMask).Value().ToInt32();
+      row.clear();
+      const data::Value& item = rs->Fields(fItem).Value();
+      if (const std::string* t = item.TextIf())
+        row += *t;
+      else
+        row += item.ToText();
+      row += '\t';
+      const data::Value& script = rs->Fields(fScript).Value();
+      row += script.TextIf() ? Trimmed(*script.TextIf()) : std::string_view(text::Trim(script.ToText()));
+      row += '\t';
+      if (mask & 4) AppendCatalogueHours(row, rs->Fields(fRR).Value(), format);
+      row += "\t\t";
+      if (mask & 1) AppendCatalogueHours(row, rs->Fields(fPT).Value(), format);
+      row += '\t';
+      char digits[16];
+      row.append(digits, std::to_chars(digits, digits + sizeof digits, mask).ptr);
+      g.AddItem(row);
+      last = g.Rows() - 1;
       GreyByMask(g, last, mask);
-      rs->MoveNext();
     }
+    // The load leaves the last item current, as adding each one made it.
+    if (last > 0) g.Row(last);
     if (g.Rows() > 11)
       g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - editor::kRowStepTwips);
     if (g.Rows() > 2) g.RemoveItem(1);

@@ -96,6 +96,12 @@ template <typename F> std::string MapChars(std::string_view s, F f) {
   out.reserve(s.size());
   size_t i = 0;
   while (i < s.size()) {
+    // Plain ASCII, the common case, maps byte by byte.
+    if (static_cast<unsigned char>(s[i]) < 0x80) {
+      out.push_back(static_cast<char>(f(static_cast<unsigned char>(s[i]))));
+      ++i;
+      continue;
+    }
     size_t start = i;
     auto c = DecodeUtf8(s, i);
     if (!c) { // keep bytes of an invalid sequence as they are

@@ -122,6 +122,7 @@ RecordsetPtr ReadRecordset(Statement& st) {
     rs->Fields().Append(unique, type, type == DataType::VarWChar ? v.longestText : 0);
   }
   rs->Open();
+  rs->ReserveRecords(rows.size());
   for (auto& row : rows)
     rs->AppendLoaded(std::move(row));
   rs->MoveFirst();
