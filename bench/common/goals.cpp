@@ -35,13 +35,11 @@ public:
   void ReportRuns(const std::vector<Run>& runs) override {
     ConsoleReporter::ReportRuns(runs);
     for (const Run& run : runs) {
-      if (run.run_type != Run::RT_Iteration || run.error_occurred || run.iterations == 0)
-        continue;
+      if (run.run_type != Run::RT_Iteration || run.error_occurred || run.iterations == 0) continue;
       auto& measures = seen_[run.benchmark_name()];
       const bool wall = !run.run_name.time_type.empty(); // manual or real time asked for
-      const double perIteration =
-          (wall ? run.real_accumulated_time : run.cpu_accumulated_time) /
-          static_cast<double>(run.iterations);
+      const double perIteration = (wall ? run.real_accumulated_time : run.cpu_accumulated_time) /
+                                  static_cast<double>(run.iterations);
       Keep(measures, "", perIteration, true);
       for (const auto& [name, counter] : run.counters) {
         // Rates are best high, everything else is kept as the least.

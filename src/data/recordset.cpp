@@ -93,6 +93,26 @@ struct SortKey {
 
 // --- FieldCollection ------------------------------------------------------
 
+namespace {
+
+char FoldAscii(char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - ('a' - 'A')) : c; }
+
+// FNV-1a over the name with ASCII letters folded.
+uint32_t NameHash(std::string_view name) {
+  uint32_t h = 2166136261u;
+  for (char c : name)
+    h = (h ^ static_cast<unsigned char>(FoldAscii(c))) * 16777619u;
+  return h;
+}
+
+bool IsAscii(std::string_view s) {
+  for (char c : s)
+    if (static_cast<unsigned char>(c) >= 0x80) return false;
+  return true;
+}
+
+} // namespace
+
 void FieldCollection::Append(std::string name, DataType type, long definedSize, long attributes) {
   if (owner_.open_ || !owner_.records_.empty())
     throw Error(3219,
@@ -101,10 +121,42 @@ void FieldCollection::Append(std::string name, DataType type, long definedSize, 
                 kSource);
   if (name.empty()) throw Error(err::kBadArguments, "A field needs a name", kSource);
   std::string key = FoldName(name);
-  if (byName_.count(key))
+  if (IndexOf(key))
     throw Error(err::kBadArguments, "The record set already has a field \"" + name + "\"", kSource);
-  byName_.emplace(std::move(key), defs_.size());
+  upper_.push_back(std::move(key));
   defs_.push_back(FieldDef{std::move(name), type, definedSize, attributes});
+  // Keep the table at most half full.
+  if (slots_.size() < 2 * defs_.size()) {
+    size_t size = 8;
+    while (size < 2 * defs_.size())
+      size *= 2;
+    slots_.assign(size, -1);
+    for (size_t i = 0; i + 1 < defs_.size(); ++i) {
+      size_t slot = NameHash(upper_[i]) & (size - 1);
+      while (slots_[slot] >= 0)
+        slot = (slot + 1) & (size - 1);
+      slots_[slot] = static_cast<int32_t>(i);
+    }
+  }
+  size_t slot = NameHash(upper_.back()) & (slots_.size() - 1);
+  while (slots_[slot] >= 0)
+    slot = (slot + 1) & (slots_.size() - 1);
+  slots_[slot] = static_cast<int32_t>(defs_.size() - 1);
+}
+
+std::optional<size_t> FieldCollection::Lookup(std::string_view name, bool foldAscii) const {
+  if (slots_.empty()) return std::nullopt;
+  const size_t mask = slots_.size() - 1;
+  for (size_t slot = NameHash(name) & mask; slots_[slot] >= 0; slot = (slot + 1) & mask) {
+    const auto index = static_cast<size_t>(slots_[slot]);
+    const std::string& upper = upper_[index];
+    if (upper.size() != name.size()) continue;
+    bool same = true;
+    for (size_t i = 0; i < name.size() && same; ++i)
+      same = (foldAscii ? FoldAscii(name[i]) : name[i]) == upper[i];
+    if (same) return index;
+  }
+  return std::nullopt;
 }
 
 const FieldDef& FieldCollection::Item(size_t index) const {
@@ -118,26 +170,10 @@ const FieldDef& FieldCollection::Item(size_t index) const {
 }
 
 std::optional<size_t> FieldCollection::IndexOf(std::string_view name) const {
-  // Field names are short ASCII words: fold them on the stack. Anything
-  // else takes the full case mapping.
-  constexpr size_t kShort = 64;
-  if (name.size() <= kShort) {
-    char folded[kShort];
-    bool ascii = true;
-    for (size_t i = 0; i < name.size() && ascii; ++i) {
-      const auto c = static_cast<unsigned char>(name[i]);
-      ascii = c < 0x80;
-      folded[i] = static_cast<char>(c >= 'a' && c <= 'z' ? c - ('a' - 'A') : c);
-    }
-    if (ascii) {
-      auto it = byName_.find(std::string_view(folded, name.size()));
-      if (it == byName_.end()) return std::nullopt;
-      return it->second;
-    }
-  }
-  auto it = byName_.find(FoldName(name));
-  if (it == byName_.end()) return std::nullopt;
-  return it->second;
+  // Field names are ASCII words as a rule: their letters fold as they are
+  // compared. Anything else takes the full case mapping first.
+  if (IsAscii(name)) return Lookup(name, true);
+  return Lookup(FoldName(name), false);
 }
 
 // --- Field ----------------------------------------------------------------

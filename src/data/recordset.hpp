@@ -12,7 +12,6 @@
 #include "data/value.hpp"
 
 #include <cstdint>
-#include <functional>
 #include <memory>
 #include <optional>
 #include <string>
@@ -59,14 +58,12 @@ private:
   friend class Field;
   Recordset& owner_;
   std::vector<FieldDef> defs_;
-  // Upper-case name -> index, looked up by a view without a copy.
-  struct NameHash {
-    using is_transparent = void;
-    size_t operator()(std::string_view s) const noexcept {
-      return std::hash<std::string_view>{}(s);
-    }
-  };
-  std::unordered_map<std::string, size_t, NameHash, std::equal_to<>> byName_;
+  // Names are found through a small open-addressed table of indexes into
+  // defs_, hashed on the name with ASCII letters folded, so a look-up by a
+  // literal neither allocates nor folds a copy.
+  std::optional<size_t> Lookup(std::string_view folded, bool foldAscii) const;
+  std::vector<std::string> upper_; // each field's name in upper case
+  std::vector<int32_t> slots_;     // -1: empty
 };
 
 // A field of the current record.

@@ -115,10 +115,6 @@ std::string_view Trimmed(std::string_view s) {
   return s.substr(first, s.find_last_not_of(' ') - first + 1);
 }
 
-bool Contains(const std::string& haystackUpper, const std::string& needleUpper) {
-  return haystackUpper.find(needleUpper) != std::string::npos;
-}
-
 } // namespace
 
 void frmLabour::LoadScheduleItems(long scheduleNo, const std::string& firstId,
@@ -148,7 +144,8 @@ void frmLabour::LoadScheduleItems(long scheduleNo, const std::string& firstId,
         row += item.ToText();
       row += '\t';
       const data::Value& script = rs->Fields(fScript).Value();
-      row += script.TextIf() ? Trimmed(*script.TextIf()) : std::string_view(text::Trim(script.ToText()));
+      row += script.TextIf() ? Trimmed(*script.TextIf())
+                             : std::string_view(text::Trim(script.ToText()));
       row += '\t';
       if (mask & 4) AppendCatalogueHours(row, rs->Fields(fRR).Value(), format);
       row += "\t\t";
@@ -295,19 +292,25 @@ void frmLabour::SearchLabourItems() {
   const grid::FlexGrid& cat = FGLabourItems(k);
   {
     editor::RedrawSuspended suspended(fgSearch);
+    std::string rowText;
+    int last = 0;
     for (int i = 1; i < cat.Rows(); ++i) {
-      if (!Contains(text::UCase(cat.TextView(i, col::kItemNo)), needle) &&
-          !Contains(text::UCase(cat.TextView(i, col::kDescription)), needle))
+      if (!text::ContainsNoCase(cat.TextView(i, col::kItemNo), needle) &&
+          !text::ContainsNoCase(cat.TextView(i, col::kDescription), needle))
         continue;
-      std::string rowText;
-      for (int c = 0; c <= 5; ++c)
-        rowText += std::string(cat.TextView(i, c)) + '\t';
-      rowText += std::to_string(i);
+      rowText.clear();
+      for (int c = 0; c <= 5; ++c) {
+        rowText += cat.TextView(i, c);
+        rowText += '\t';
+      }
+      char number[16];
+      rowText.append(number, std::to_chars(number, number + sizeof number, i).ptr);
       fgSearch.AddItem(rowText);
-      const int last = fgSearch.Rows() - 1;
-      fgSearch.Row(last);
-      GreyByMask(fgSearch, last, MaskOf(fgSearch.TextMatrix(last, 5)));
+      last = fgSearch.Rows() - 1;
+      GreyByMask(fgSearch, last, MaskOf(std::string(cat.TextView(i, 5))));
     }
+    // The last result is current, as adding each one made it.
+    if (last > 0) fgSearch.Row(last);
   }
 
   if (fgSearch.Rows() < 3) {

@@ -108,37 +108,6 @@ void VehiclePartRow(data::Recordset& rs, const VehicleFields& f, std::string& ro
   AppendDeciphered(row, field(f.group), scratch);
 }
 
-// Whether `haystack` holds `needleUpper` (a text in upper case) without
-// regard to case. An ASCII needle is compared byte by byte: bytes of other
-// characters can never match it, so no upper-case copy of the haystack is
-// needed.
-bool ContainsNoCase(std::string_view haystack, std::string_view needleUpper, bool asciiNeedle) {
-  if (!asciiNeedle) return text::UCase(haystack).find(needleUpper) != std::string::npos;
-  const size_t n = needleUpper.size();
-  if (n == 0) return true;
-  if (haystack.size() < n) return false;
-  auto upper = [](unsigned char c) {
-    return static_cast<unsigned char>(c >= 'a' && c <= 'z' ? c - ('a' - 'A') : c);
-  };
-  const auto first = static_cast<unsigned char>(needleUpper[0]);
-  const size_t lastStart = haystack.size() - n;
-  for (size_t i = 0; i <= lastStart; ++i) {
-    if (upper(static_cast<unsigned char>(haystack[i])) != first) continue;
-    size_t k = 1;
-    while (k < n && upper(static_cast<unsigned char>(haystack[i + k])) ==
-                        static_cast<unsigned char>(needleUpper[k]))
-      ++k;
-    if (k == n) return true;
-  }
-  return false;
-}
-
-bool IsAscii(std::string_view s) {
-  for (char c : s)
-    if (static_cast<unsigned char>(c) >= 0x80) return false;
-  return true;
-}
-
 } // namespace
 
 void frmParts::LoadVehicleParts(const std::string& make, const std::string& catNo,
@@ -297,7 +266,6 @@ void frmParts::SearchParts() {
   const std::string wanted = text::Trim(txtSearch.Text());
   if (wanted.empty()) return;
   const std::string needle = text::UCase(wanted);
-  const bool asciiNeedle = IsAscii(needle);
 
   ClearSearchResults();
   {
@@ -305,8 +273,8 @@ void frmParts::SearchParts() {
     const grid::FlexGrid& parts = FGParts;
     std::string row;
     for (int r = 1; r < parts.Rows(); ++r) {
-      if (!ContainsNoCase(parts.TextView(r, cat::kItemNo), needle, asciiNeedle) &&
-          !ContainsNoCase(parts.TextView(r, cat::kDescription), needle, asciiNeedle))
+      if (!text::ContainsNoCase(parts.TextView(r, cat::kItemNo), needle) &&
+          !text::ContainsNoCase(parts.TextView(r, cat::kDescription), needle))
         continue;
       row.clear();
       for (int c = cat::kItemNo; c <= cat::kPartNo; ++c) {

@@ -162,6 +162,29 @@ bool EqualsNoCase(std::string_view a, std::string_view b) {
   return UCase(a) == UCase(b);
 }
 
+bool ContainsNoCase(std::string_view haystack, std::string_view needleUpper) {
+  const size_t n = needleUpper.size();
+  if (n == 0) return true;
+  for (char c : needleUpper)
+    if (static_cast<unsigned char>(c) >= 0x80)
+      return UCase(haystack).find(needleUpper) != std::string::npos;
+  if (haystack.size() < n) return false;
+  auto upper = [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - ('a' - 'A')) : c; };
+  const char first = needleUpper[0];
+  const char firstLower =
+      first >= 'A' && first <= 'Z' ? static_cast<char>(first + ('a' - 'A')) : first;
+  const char* p = haystack.data();
+  const char* const lastStart = p + (haystack.size() - n);
+  for (; p <= lastStart; ++p) {
+    if (*p != first && *p != firstLower) continue;
+    size_t k = 1;
+    while (k < n && upper(p[k]) == needleUpper[k])
+      ++k;
+    if (k == n) return true;
+  }
+  return false;
+}
+
 std::string Cp1252ToUtf8(std::string_view bytes) {
   std::string out;
   out.reserve(bytes.size());
