@@ -27,25 +27,6 @@ std::string FoldName(std::string_view name) { return text::UCase(name); }
 
 bool IsIntegerType(DataType t) { return t == DataType::Integer || t == DataType::SmallInt; }
 
-// Whether a value already has the type a field of `type` holds.
-bool HoldsType(const Value& v, DataType type) {
-  switch (type) {
-  case DataType::SmallInt:
-    return v.Type() == ValueType::Integer;
-  case DataType::Integer:
-    return v.Type() == ValueType::Long;
-  case DataType::Double:
-    return v.Type() == ValueType::Double;
-  case DataType::Boolean:
-    return v.Type() == ValueType::Boolean;
-  case DataType::VarWChar:
-    return v.Type() == ValueType::Text;
-  case DataType::Variant:
-    return true;
-  }
-  return false;
-}
-
 // Evaluates a parsed filter on one record. `leaf` numbers the comparisons
 // in text order; every one is visited so the numbering stays in step. The
 // recursion is as deep as the parentheses nest, which the parser bounds.
@@ -247,21 +228,29 @@ void Recordset::Collect(std::string_view name, const Value& v) {
 void Recordset::WriteField(size_t field, const Value& v) {
   Record& rec = Current();
   const FieldDef& def = fields_.defs_[field];
+  // A value of the field's own type is compared and copied as it is.
+  const bool asItIs = v.IsNull() || HoldsType(v, def.type);
   Value converted;
-  try {
-    converted = v.ConvertTo(def.type);
-  } catch (const Error& e) {
-    throw Error(e.Number(),
-                "Field \"" + def.name + "\" (" + DataTypeName(def.type) + "): " + e.Description(),
-                kSource);
+  if (!asItIs) {
+    try {
+      converted = v.ConvertTo(def.type);
+    } catch (const Error& e) {
+      throw Error(e.Number(),
+                  "Field \"" + def.name + "\" (" + DataTypeName(def.type) + "): " + e.Description(),
+                  kSource);
+    }
   }
-  if (rec.values[field] == converted) return;
+  const Value& wanted = asItIs ? v : converted;
+  if (rec.values[field] == wanted) return;
   if (rec.status == RecordStatus::Unchanged) {
     rec.original = std::make_unique<std::vector<Value>>(rec.values);
     rec.status = RecordStatus::Modified;
   }
-  rec.values[field] = std::move(converted);
-  index_.erase(field);
+  if (asItIs)
+    rec.values[field] = v;
+  else
+    rec.values[field] = std::move(converted);
+  if (!index_.empty()) index_.erase(field);
 }
 
 void Recordset::Open() {

@@ -97,7 +97,9 @@ WriteBackTargets CheckWriteBack(data::Recordset& items, const std::vector<Planne
                         "program must be corrected.",
                     words.source);
       try {
-        (void)w.value.ConvertTo(items.Fields().Item(*index).type);
+        // Only a value of another type can be refused.
+        const data::DataType type = items.Fields().Item(*index).type;
+        if (!w.value.IsNull() && !data::HoldsType(w.value, type)) (void)w.value.ConvertTo(type);
       } catch (const Error& e) {
         throw Error(e.Number(), where() + ": " + words.refusedValue(w) + " Nothing was saved.",
                     words.source);

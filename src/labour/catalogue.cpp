@@ -87,7 +87,14 @@ void AppendCatalogueHours(std::string& row, const data::Value& v, HoursFormatter
 }
 
 // The whole-number value of a mask text ("5", " 7"); 0 when it is none.
-int MaskOf(const std::string& s) {
+// The load writes masks as plain digits, read directly; any other text
+// goes through the general number reader.
+int MaskOf(std::string_view s) {
+  if (!s.empty() && s.size() <= 3 && s.find_first_not_of("0123456789") == std::string_view::npos) {
+    int n = 0;
+    std::from_chars(s.data(), s.data() + s.size(), n);
+    return n;
+  }
   auto n = text::ParseNumber(s);
   return n ? static_cast<int>(*n) : 0;
 }
@@ -292,22 +299,17 @@ void frmLabour::SearchLabourItems() {
   const grid::FlexGrid& cat = FGLabourItems(k);
   {
     editor::RedrawSuspended suspended(fgSearch);
-    std::string rowText;
     int last = 0;
     for (int i = 1; i < cat.Rows(); ++i) {
       if (!text::ContainsNoCase(cat.TextView(i, col::kItemNo), needle) &&
           !text::ContainsNoCase(cat.TextView(i, col::kDescription), needle))
         continue;
-      rowText.clear();
-      for (int c = 0; c <= 5; ++c) {
-        rowText += cat.TextView(i, c);
-        rowText += '\t';
-      }
+      // The item's six cells, then its row in the schedule grid.
       char number[16];
-      rowText.append(number, std::to_chars(number, number + sizeof number, i).ptr);
-      fgSearch.AddItem(rowText);
+      const char* end = std::to_chars(number, number + sizeof number, i).ptr;
+      fgSearch.AddItemFrom(cat, i, 6, std::string_view(number, static_cast<size_t>(end - number)));
       last = fgSearch.Rows() - 1;
-      GreyByMask(fgSearch, last, MaskOf(std::string(cat.TextView(i, 5))));
+      GreyByMask(fgSearch, last, MaskOf(cat.TextView(i, 5)));
     }
     // The last result is current, as adding each one made it.
     if (last > 0) fgSearch.Row(last);

@@ -271,19 +271,16 @@ void frmParts::SearchParts() {
   {
     editor::RedrawSuspended suspended(fgSearch);
     const grid::FlexGrid& parts = FGParts;
-    std::string row;
     for (int r = 1; r < parts.Rows(); ++r) {
       if (!text::ContainsNoCase(parts.TextView(r, cat::kItemNo), needle) &&
           !text::ContainsNoCase(parts.TextView(r, cat::kDescription), needle))
         continue;
-      row.clear();
-      for (int c = cat::kItemNo; c <= cat::kPartNo; ++c) {
-        row += parts.TextView(r, c);
-        row += '\t';
-      }
+      // The part's cells up to its part number, then its row in the
+      // available parts.
       char number[16];
-      row.append(number, std::to_chars(number, number + sizeof number, r).ptr);
-      fgSearch.AddItem(row);
+      const char* end = std::to_chars(number, number + sizeof number, r).ptr;
+      fgSearch.AddItemFrom(parts, r, cat::kPartNo + 1,
+                           std::string_view(number, static_cast<size_t>(end - number)));
     }
   }
   ShowSearchResults();

@@ -6,6 +6,10 @@
 #include <cstdint>
 #include <cstdio>
 
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
+
 namespace belvane::text {
 
 namespace {
@@ -169,19 +173,47 @@ bool ContainsNoCase(std::string_view haystack, std::string_view needleUpper) {
     if (static_cast<unsigned char>(c) >= 0x80)
       return UCase(haystack).find(needleUpper) != std::string::npos;
   if (haystack.size() < n) return false;
-  auto upper = [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - ('a' - 'A')) : c; };
-  const char first = needleUpper[0];
-  const char firstLower =
-      first >= 'A' && first <= 'Z' ? static_cast<char>(first + ('a' - 'A')) : first;
-  const char* p = haystack.data();
-  const char* const lastStart = p + (haystack.size() - n);
-  for (; p <= lastStart; ++p) {
-    if (*p != first && *p != firstLower) continue;
-    size_t k = 1;
-    while (k < n && upper(p[k]) == needleUpper[k])
-      ++k;
-    if (k == n) return true;
+  // ASCII letters in upper case; every other byte as it is.
+  static constexpr std::array<unsigned char, 256> kUpper = [] {
+    std::array<unsigned char, 256> t{};
+    for (int c = 0; c < 256; ++c)
+      t[static_cast<size_t>(c)] = static_cast<unsigned char>(c >= 'a' && c <= 'z' ? c - 32 : c);
+    return t;
+  }();
+  const auto* needle = reinterpret_cast<const unsigned char*>(needleUpper.data());
+  const auto* p = reinterpret_cast<const unsigned char*>(haystack.data());
+  const size_t last = n - 1;
+  const size_t starts = haystack.size() - n + 1; // positions a match can start at
+  // A candidate start has the needle's first and last bytes in place. Each
+  // is tested with one comparison: a letter's two cases differ only in bit
+  // 0x20, so that bit is set on both sides; other bytes compare as they are.
+  auto foldOf = [](unsigned char c) -> unsigned char { return c >= 'A' && c <= 'Z' ? 0x20 : 0; };
+  const unsigned char foldFirst = foldOf(needle[0]), first = needle[0] | foldFirst;
+  const unsigned char foldLast = foldOf(needle[last]), lastByte = needle[last] | foldLast;
+  auto matchesAt = [&](size_t i) {
+    for (size_t k = 1; k < last; ++k)
+      if (kUpper[p[i + k]] != needle[k]) return false;
+    return true;
+  };
+  size_t i = 0;
+#if defined(__SSE2__)
+  // Sixteen candidate starts at a time; both loads stay inside the text.
+  const __m128i vFirst = _mm_set1_epi8(static_cast<char>(first));
+  const __m128i vFoldFirst = _mm_set1_epi8(static_cast<char>(foldFirst));
+  const __m128i vLast = _mm_set1_epi8(static_cast<char>(lastByte));
+  const __m128i vFoldLast = _mm_set1_epi8(static_cast<char>(foldLast));
+  for (; i + 16 <= starts; i += 16) {
+    const __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p + i));
+    const __m128i b = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p + i + last));
+    const __m128i both = _mm_and_si128(_mm_cmpeq_epi8(_mm_or_si128(a, vFoldFirst), vFirst),
+                                       _mm_cmpeq_epi8(_mm_or_si128(b, vFoldLast), vLast));
+    for (auto mask = static_cast<unsigned>(_mm_movemask_epi8(both)); mask != 0; mask &= mask - 1)
+      if (matchesAt(i + static_cast<size_t>(__builtin_ctz(mask)))) return true;
   }
+#endif
+  for (; i < starts; ++i)
+    if ((p[i] | foldFirst) == first && (p[i + last] | foldLast) == lastByte && matchesAt(i))
+      return true;
   return false;
 }
 
