@@ -124,6 +124,15 @@ void ApplyRemovals(data::Recordset& items, const std::vector<std::string>& remov
 
 void ApplyWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& plan,
                     const WriteBackTargets* targets) {
+  // Each field name's index, found once per write-back.
+  std::vector<std::pair<const char*, size_t>> fieldsSeen;
+  auto field = [&](const char* name) {
+    for (const auto& [seen, index] : fieldsSeen)
+      if (seen == name) return items.Fields(index);
+    const data::Field f = items.Fields(name);
+    fieldsSeen.emplace_back(name, *items.Fields().IndexOf(name));
+    return f;
+  };
   for (size_t i = 0; i < plan.size(); ++i) {
     const PlannedRecord& p = plan[i];
     if (p.kind == PlannedRecord::Kind::Delete) {
@@ -136,7 +145,7 @@ void ApplyWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& pl
                items.MoveToStored(*(*targets)[i])))
       FindItemId(items, p.id);
     for (const FieldWrite& w : p.writes)
-      items.Collect(w.field, w.value);
+      field(w.field).SetValue(w.value);
   }
 }
 
