@@ -6,38 +6,20 @@
 #include "editor/grid_layout.hpp"
 #include "forms/runtime.hpp"
 #include "labour/frm_labour.hpp"
-#include "text/error.hpp"
 #include "text/number.hpp"
 #include "text/strings.hpp"
 
 #include <charconv>
-#include <cstdint>
-#include <cstring>
 #include <optional>
 #include <string>
 #include <string_view>
-#include <unordered_map>
+#include <vector>
 
 namespace belvane::labour {
 
 namespace {
 
-// Formats hours with the hours pattern. A schedule repeats a few dozen
-// hours values over thousands of items, so each load keeps the texts it has
-// made.
-class HoursFormatter {
-public:
-  const std::string& operator()(double hours) {
-    uint64_t bits;
-    std::memcpy(&bits, &hours, sizeof bits);
-    auto [it, added] = made_.try_emplace(bits);
-    if (added) it->second = text::FormatNumber(hours, text::kHours);
-    return it->second;
-  }
-
-private:
-  std::unordered_map<uint64_t, std::string> made_;
-};
+using HoursFormatter = text::NumberTexts;
 
 // The number a deciphered hours text holds: written with "." whatever the
 // reader's locale. Plain digits with one point are read directly; anything
@@ -105,16 +87,6 @@ void GreyByMask(grid::FlexGrid& g, int row, int mask) {
   if (!(mask & 1)) g.CellBackColorAt(row, 4, grid::kGrey);
 }
 
-// The index of a field the schedule query gives; error 3265 names it when
-// the catalogue lacks it.
-size_t FieldIndex(const data::Recordset& rs, const char* name) {
-  if (const auto i = rs.Fields().IndexOf(name)) return *i;
-  throw Error(err::kItemNotFound,
-              std::string("The labour items have no field ") + name +
-                  "; the catalogue must be corrected",
-              "frmLabour.LoadScheduleItems");
-}
-
 // Without the spaces at either end (as Trim).
 std::string_view Trimmed(std::string_view s) {
   const size_t first = s.find_first_not_of(' ');
@@ -130,47 +102,42 @@ void frmLabour::LoadScheduleItems(long scheduleNo, const std::string& firstId,
   forms::FlexGrid& g = FGLabourItems(gridIndex);
   if (g.Rows() > 2) return; // filled already in this session
 
-  data::RecordsetPtr rs;
-  data::Catalogue()->GetLabourItems(rs, scheduleNo, firstId, secondId, bodyId);
-
-  {
-    editor::RedrawSuspended suspended(g);
-    const size_t fMask = FieldIndex(*rs, "allow_tick"), fItem = FieldIndex(*rs, "ItemNo"),
-                 fScript = FieldIndex(*rs, "Script"), fRR = FieldIndex(*rs, "rrhour"),
-                 fPT = FieldIndex(*rs, "pthour");
-    HoursFormatter format;
-    std::string row;
-    int last = 0;
-    for (; !rs->Eof(); rs->MoveNext()) {
-      const int mask = rs->Fields(fMask).Value().ToInt32();
-      row.clear();
-      const data::Value& item = rs->Fields(fItem).Value();
-      if (const std::string* t = item.TextIf())
-        row += *t;
-      else
-        row += item.ToText();
-      row += '\t';
-      const data::Value& script = rs->Fields(fScript).Value();
-      row += script.TextIf() ? Trimmed(*script.TextIf())
-                             : std::string_view(text::Trim(script.ToText()));
-      row += '\t';
-      if (mask & 4) AppendCatalogueHours(row, rs->Fields(fRR).Value(), format);
-      row += "\t\t";
-      if (mask & 1) AppendCatalogueHours(row, rs->Fields(fPT).Value(), format);
-      row += '\t';
-      char digits[16];
-      row.append(digits, std::to_chars(digits, digits + sizeof digits, mask).ptr);
-      g.AddItem(row);
-      last = g.Rows() - 1;
-      GreyByMask(g, last, mask);
-    }
-    // The load leaves the last item current, as adding each one made it.
-    if (last > 0) g.Row(last);
-    if (g.Rows() > 11)
-      g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - editor::kRowStepTwips);
-    if (g.Rows() > 2) g.RemoveItem(1);
-  }
-  if (rs->State() == data::adStateOpen) rs->Close();
+  // The items are read one at a time straight into the grid: a schedule of
+  // tens of thousands of items is never held twice.
+  editor::RedrawSuspended suspended(g);
+  enum Field { kMask, kItem, kScript, kRR, kPT }; // the order the catalogue gives
+  HoursFormatter format(text::kHours);
+  std::string row;
+  int last = 0;
+  data::Catalogue()->ForEachLabourItem(
+      scheduleNo, firstId, secondId, bodyId, [&](const std::vector<data::Value>& item) {
+        const int mask = item[kMask].ToInt32();
+        row.clear();
+        if (const std::string* t = item[kItem].TextIf())
+          row += *t;
+        else
+          row += item[kItem].ToText();
+        row += '\t';
+        const data::Value& script = item[kScript];
+        row += script.TextIf() ? Trimmed(*script.TextIf())
+                               : std::string_view(text::Trim(script.ToText()));
+        row += '\t';
+        if (mask & 4) AppendCatalogueHours(row, item[kRR], format);
+        row += "\t\t";
+        if (mask & 1) AppendCatalogueHours(row, item[kPT], format);
+        row += '\t';
+        char digits[16];
+        row.append(digits, std::to_chars(digits, digits + sizeof digits, mask).ptr);
+        g.AddItem(row);
+        last = g.Rows() - 1;
+        GreyByMask(g, last, mask);
+        return true;
+      });
+  // The load leaves the last item current, as adding each one made it.
+  if (last > 0) g.Row(last);
+  if (g.Rows() > 11)
+    g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - editor::kRowStepTwips);
+  if (g.Rows() > 2) g.RemoveItem(1);
 }
 
 void frmLabour::FindCatalogueItemRow(int gridIndex, long& row) {

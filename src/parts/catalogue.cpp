@@ -17,6 +17,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace belvane::parts {
 
@@ -25,29 +26,8 @@ namespace {
 namespace cat = col::cat;
 namespace sel = col::sel;
 
-// The vehicle parts fields, found once per record set.
-struct VehicleFields {
-  size_t itemNo, partName, script, side, qty, unitcost, partNo, group;
-  explicit VehicleFields(const data::Recordset& rs) {
-    auto index = [&rs](const char* name) {
-      const auto i = rs.Fields().IndexOf(name);
-      if (!i)
-        throw Error(err::kItemNotFound,
-                    std::string("The vehicle parts have no field ") + name +
-                        "; the catalogue must be corrected",
-                    "frmParts.LoadVehicleParts");
-      return *i;
-    };
-    itemNo = index("ItemNo");
-    partName = index("PARTNAME");
-    script = index("Script");
-    side = index("SIDE");
-    qty = index("QTY");
-    unitcost = index("unitcost");
-    partNo = index("partno");
-    group = index("Group");
-  }
-};
+// The vehicle part fields, in the order the catalogue gives them.
+enum VehicleField { kItemNo, kPartName, kScript, kSide, kQty, kUnitcost, kPartNo, kGroup };
 
 // A field's text without a copy where the value is a text already.
 std::string_view TextOf(const data::Value& v, std::string& scratch) {
@@ -72,13 +52,14 @@ void AppendDeciphered(std::string& row, const data::Value& v, std::string& scrat
 // Fills `row` with the row of a vehicle part: the description deciphered,
 // with the side in front of it ("L/H FRONT GUARD") unless the part has no
 // side ("O").
-void VehiclePartRow(data::Recordset& rs, const VehicleFields& f, std::string& row) {
-  auto field = [&rs](size_t i) -> const data::Value& { return rs.Fields(i).Value(); };
+void VehiclePartRow(const std::vector<data::Value>& part, text::NumberTexts& costs,
+                    std::string& row) {
+  auto field = [&part](VehicleField i) -> const data::Value& { return part[i]; };
   std::string scratch;
   row.clear();
-  row += TextOf(field(f.itemNo), scratch);
+  row += TextOf(field(kItemNo), scratch);
   row += '\t';
-  const data::Value& side = field(f.side);
+  const data::Value& side = field(kSide);
   std::string sideText;
   if (!side.IsNull()) {
     sideText = side.ToText();
@@ -88,31 +69,30 @@ void VehiclePartRow(data::Recordset& rs, const VehicleFields& f, std::string& ro
       row += "/H ";
     }
   }
-  const data::Value& partName = field(f.partName);
+  const data::Value& partName = field(kPartName);
   const std::string_view name =
       partName.IsNull() ? std::string_view() : Trimmed(TextOf(partName, scratch));
   if (name.empty())
-    row += Trimmed(TextOf(field(f.script), scratch));
+    row += Trimmed(TextOf(field(kScript), scratch));
   else
     row += cipher::DecryptField(name);
   row += '\t';
   row += sideText;
   row += '\t';
-  row += TextOf(field(f.qty), scratch);
+  row += TextOf(field(kQty), scratch);
   row += '\t';
-  const data::Value& unitcost = field(f.unitcost);
-  row += text::FormatNumber(unitcost.IsNull() ? 0 : unitcost.ToDouble(), text::kHours);
+  const data::Value& unitcost = field(kUnitcost);
+  row += costs(unitcost.IsNull() ? 0 : unitcost.ToDouble());
   row += '\t';
-  AppendDeciphered(row, field(f.partNo), scratch);
+  AppendDeciphered(row, field(kPartNo), scratch);
   row += '\t';
-  AppendDeciphered(row, field(f.group), scratch);
+  AppendDeciphered(row, field(kGroup), scratch);
 }
 
 } // namespace
 
 void frmParts::LoadVehicleParts(const std::string& make, const std::string& catNo,
                                 const std::string& body) {
-  data::RecordsetPtr rs;
   editor::RedrawSuspended suspended(FGParts);
   try {
     auto catalogue = data::Catalogue();
@@ -122,23 +102,22 @@ void frmParts::LoadVehicleParts(const std::string& make, const std::string& catN
       state = info->Collect("State").ToInt16();
       if (info->State() == data::adStateOpen) info->Close();
     }
-    catalogue->GetVehicleParts(rs, make, catNo, body, state);
-    if (rs && rs->State() == data::adStateOpen) {
-      const VehicleFields fields(*rs);
-      std::string row;
-      for (; !rs->Eof(); rs->MoveNext()) {
-        VehiclePartRow(*rs, fields, row);
-        FGParts.AddItem(row);
-      }
-      rs->Close();
-    }
+    // The parts are read one at a time straight into the grid: a catalogue
+    // of a hundred thousand parts is never held twice.
+    std::string row;
+    text::NumberTexts costs(text::kHours);
+    catalogue->ForEachVehiclePart(make, catNo, body, state,
+                                  [&](const std::vector<data::Value>& part) {
+                                    VehiclePartRow(part, costs, row);
+                                    FGParts.AddItem(row);
+                                    return true;
+                                  });
   } catch (const Error& e) {
     // The rows added so far stay. A catalogue without the table the parts
     // query reads has no vehicle parts: nothing to say.
     if (e.Number() != err::kNoSuchTable)
       forms::MsgBox(std::to_string(e.Number()) + ": " + e.Description(), forms::msgbox::kCritical);
   }
-  rs.reset();
 }
 
 void frmParts::LoadGeneralParts() {
