@@ -1,7 +1,7 @@
 // Blowfish throughput, key set-up and DecryptField, each against the same work
 // done with OpenSSL's Blowfish in the same process. After the usual table the
 // program prints the ratio of each pair (Belvane rate / OpenSSL rate; above 1
-// means Belvane is faster).
+// means Belvane is faster); the goals follow.
 
 // The low-level BF_* calls are deprecated in OpenSSL 3 but are exactly the
 // baseline wanted: plain Blowfish, one block per call.
@@ -12,6 +12,8 @@
 #include "cipher/byte_utils.hpp"
 #include "cipher/field.hpp"
 #include "text/strings.hpp"
+
+#include "goals.hpp"
 
 #include <benchmark/benchmark.h>
 
@@ -148,39 +150,6 @@ void DecryptFieldOpenSsl(benchmark::State& state) {
   state.SetItemsProcessed(state.iterations());
 }
 
-// The console table, then the Belvane / OpenSSL ratio of each pair.
-class RatioReporter : public benchmark::ConsoleReporter {
-public:
-  void ReportRuns(const std::vector<Run>& runs) override {
-    ConsoleReporter::ReportRuns(runs);
-    for (const Run& run : runs) {
-      if (run.run_type != Run::RT_Iteration || run.error_occurred) continue;
-      for (const char* rate : {"bytes_per_second", "items_per_second"}) {
-        if (auto it = run.counters.find(rate); it != run.counters.end()) {
-          rates_[run.benchmark_name()] = it->second.value;
-        }
-      }
-    }
-  }
-
-  void Finalize() override {
-    ConsoleReporter::Finalize();
-    std::printf("\nRatio (Belvane rate / OpenSSL rate):\n");
-    for (const auto& [name, rate] : rates_) {
-      const auto slash = name.find("/Belvane");
-      if (slash == std::string::npos) continue;
-      std::string base = name;
-      base.replace(slash, 8, "/OpenSSL");
-      if (auto it = rates_.find(base); it != rates_.end() && it->second > 0) {
-        std::printf("  %-28s %.2f\n", name.substr(0, slash).c_str(), rate / it->second);
-      }
-    }
-  }
-
-private:
-  std::map<std::string, double> rates_;
-};
-
 } // namespace
 
 int main(int argc, char** argv) {
@@ -193,10 +162,17 @@ int main(int argc, char** argv) {
   RegisterBenchmark("KeySetup36/OpenSSL", KeySetupOpenSsl)->Unit(benchmark::kMicrosecond);
   RegisterBenchmark("DecryptFieldOneBlock/Belvane", DecryptFieldBelvane);
   RegisterBenchmark("DecryptFieldOneBlock/OpenSSL", DecryptFieldOpenSsl);
-  benchmark::Initialize(&argc, argv);
-  if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 1;
-  RatioReporter reporter;
-  benchmark::RunSpecifiedBenchmarks(&reporter);
-  benchmark::Shutdown();
-  return 0;
+  using belvane::bench::Measure;
+  auto rate = [](const char* name, const char* counter, const char* label = "") {
+    return Measure{name, counter, label};
+  };
+  belvane::bench::AddRatioGoal(
+      "DecryptField, one-block values (rate)",
+      rate("DecryptFieldOneBlock/Belvane", "items_per_second"),
+      rate("DecryptFieldOneBlock/OpenSSL", "items_per_second", "OpenSSL Blowfish, same steps"), 1.5,
+      belvane::bench::Limit::AtLeast);
+  belvane::bench::AddValueGoal("DecryptField, one-block values per second",
+                               rate("DecryptFieldOneBlock/Belvane", "items_per_second"), 15e6,
+                               belvane::bench::Limit::AtLeast, "values/s");
+  return belvane::bench::RunWithGoals(argc, argv);
 }

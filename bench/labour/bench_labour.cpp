@@ -1,21 +1,23 @@
 // The labour editor at the sizes an estimator meets at the far end, each
 // against a baseline in the same run:
 //
-//   Quote*     a 2,000-line quote (6,000 stored records: R&R, RA and PAINT
-//              of every line) opened in edit mode; the estimator changes
-//              three lines' hours, then the editor writes the lines back
-//              (SaveLabourChanges during the session, and Close). Baseline:
-//              the same 6,000 Finds by ITEMID and field writes done directly
-//              on the record set.
+//   Quote*     a quote of 500, 2,000 or 5,000 lines (three stored records
+//              each: R&R, RA and PAINT) opened in edit mode; the estimator
+//              changes three lines' hours, then the editor writes the lines
+//              back (SaveLabourChanges during the session, and Close).
+//              Baseline: the same Finds by ITEMID and field writes done
+//              directly on the record set, once.
 //   Schedule*  a schedule of 20,000 items, half of them with enciphered
 //              hours, filled into its grid as the editor opens, and one text
-//              search over it. Baselines: reading (and deciphering) the same
-//              record set from the catalogue without a grid, the grid's
-//              AddItem of the same rows, and the search's scan of the grid
-//              without filling the result grid.
+//              search over it. Baselines: the same rows read with SQLite
+//              alone (and their hours deciphered), GetLabourItems' record
+//              set against stepping its query, the grid's AddItem of the
+//              same rows, and a plain case-free scan of the same texts.
 //
-// Session benchmarks time only their phase (manual time); the rest of the
-// session (building the quote, the other phases) runs untimed.
+// Every benchmark times only its phase in the thread's processor time
+// (manual time); the rest of the session (building the quote, the other
+// phases) runs untimed. The goals at the end compare each with its
+// baseline.
 
 #include "cipher/field.hpp"
 #include "data/catalogue.hpp"
@@ -30,7 +32,11 @@
 #include "text/number.hpp"
 #include "text/strings.hpp"
 
+#include "bench_util.hpp"
+#include "goals.hpp"
+
 #include <benchmark/benchmark.h>
+#include <sqlite3.h>
 #include <unistd.h>
 
 #include <array>
@@ -46,18 +52,14 @@ using namespace belvane;
 
 namespace {
 
-using Clock = std::chrono::steady_clock;
+using Clock = bench::ThreadClock;
+using bench::Seconds;
 namespace col = labour::col;
-
-double Seconds(Clock::time_point from, Clock::time_point to) {
-  return std::chrono::duration<double>(to - from).count();
-}
 
 // A field key of the benchmark's own, so that no machine key file matters.
 constexpr const char* kFieldKey =
     "00112233445566778899AABBCCDDEEFF0123456789ABCDEFFEDCBA98765432100F1E2D3C";
 
-constexpr int kQuoteLines = 2000;
 constexpr int kScheduleItems = 20000;
 constexpr const char* kBigSchedule = "N20000";   // the 20,000 items
 constexpr const char* kSmallSchedule = "N30000"; // the quote's vehicle: 40 items
@@ -115,22 +117,26 @@ public:
     data::SetCatalogueLocation(path_);
   }
   ~BenchCatalogue() { std::filesystem::remove(path_); }
+  const std::string& Path() const { return path_; }
 
 private:
   std::string path_;
 };
 
-void UseCatalogue() { static BenchCatalogue catalogue; }
+const BenchCatalogue& UseCatalogue() {
+  static BenchCatalogue catalogue;
+  return catalogue;
+}
 
-// ---- the 2,000-line quote ----
+// ---- the quotes ----
 
-// The quote as a host loads it: 2,000 lines of three stored records each,
-// ITEMIDs 1 to 6,000, in item number order.
-data::RecordsetPtr MakeQuote() {
+// The quote as a host loads it: lines of three stored records each,
+// ITEMIDs 1 to 3 x lines, in item number order.
+data::RecordsetPtr MakeQuote(int lines) {
   data::RecordsetPtr quote = data::QuoteStore::NewItemRecordset();
   data::Recordset& rs = *quote;
   int id = 0;
-  for (int line = 0; line < kQuoteLines; ++line) {
+  for (int line = 0; line < lines; ++line) {
     struct Op {
       const char* category;
       const char* field;
@@ -186,21 +192,21 @@ bool Session(benchmark::State& state, data::RecordsetPtr& quote, const char* sch
 }
 
 // The estimator's change: R&R hours of the first, middle and last line.
-constexpr std::array<int, 3> kChangedRows = {1, kQuoteLines / 2, kQuoteLines};
-void ChangeHours(labour::frmLabour& f, forms::SimulatedUser& user) {
-  for (int row : kChangedRows) {
+std::array<int, 3> ChangedRows(int lines) { return {1, lines / 2, lines}; }
+void ChangeHours(labour::frmLabour& f, forms::SimulatedUser& user, int lines) {
+  for (int row : ChangedRows(lines)) {
     user.ClickCell(f.FGSelectedLabour, row, col::kRRHours);
     user.Type("2.5\n");
   }
 }
 
 // The changed hours reached the record set, and nothing else was lost.
-bool Written(benchmark::State& state, data::Recordset& rs) {
+bool Written(benchmark::State& state, data::Recordset& rs, int lines) {
   int changed = 0;
   for (rs.MoveFirst(); !rs.Eof(); rs.MoveNext())
     if (rs.Collect("Category").ToText() == "R&R" && rs.Collect("rrhour").ToDouble() == 2.5)
       ++changed;
-  if (rs.RecordCount() != 3 * kQuoteLines || changed != static_cast<int>(kChangedRows.size())) {
+  if (rs.RecordCount() != 3 * lines || changed != static_cast<int>(ChangedRows(lines).size())) {
     state.SkipWithError("the write-back did not give the expected records");
     return false;
   }
@@ -211,32 +217,33 @@ enum class QuotePhase { Load, SaveLabourChanges, Close };
 
 void QuoteSession(benchmark::State& state, QuotePhase phase) {
   UseCatalogue();
+  const int lines = static_cast<int>(state.range(0));
   forms::SimulatedUser user;
   for (auto _ : state) {
-    data::RecordsetPtr quote = MakeQuote();
+    data::RecordsetPtr quote = MakeQuote(lines);
     double seconds = 0;
     const auto opened = Clock::now();
     const bool ok = Session(state, quote, kSmallSchedule, [&](labour::frmLabour& f) {
       if (phase == QuotePhase::Load) seconds = Seconds(opened, Clock::now());
-      if (f.FGSelectedLabour.Rows() != kQuoteLines + 1) {
+      if (f.FGSelectedLabour.Rows() != lines + 1) {
         state.SkipWithError("the quote's lines did not load");
         return;
       }
-      ChangeHours(f, user);
+      ChangeHours(f, user, lines);
       if (phase == QuotePhase::SaveLabourChanges) {
         const auto t0 = Clock::now();
         CForms().SaveLabourChanges();
         seconds = Seconds(t0, Clock::now());
-        if (!Written(state, *quote)) return;
+        if (!Written(state, *quote, lines)) return;
       }
       const auto t0 = Clock::now();
       user.Click(f.cmdClose);
       if (phase == QuotePhase::Close) seconds = Seconds(t0, Clock::now());
     });
-    if (!ok || state.error_occurred() || !Written(state, *quote)) break;
+    if (!ok || state.error_occurred() || !Written(state, *quote, lines)) break;
     state.SetIterationTime(seconds);
   }
-  state.counters["records"] = 3 * kQuoteLines;
+  state.counters["records"] = 3 * lines;
 }
 
 void BM_QuoteLoad(benchmark::State& state) { QuoteSession(state, QuotePhase::Load); }
@@ -249,12 +256,13 @@ void BM_QuoteClose(benchmark::State& state) { QuoteSession(state, QuotePhase::Cl
 // each record found by its ITEMID and its fields written once, as the
 // writer's last pass writes them.
 void BM_QuoteFindAndWriteBaseline(benchmark::State& state) {
+  const int lines = static_cast<int>(state.range(0));
   for (auto _ : state) {
-    data::RecordsetPtr quote = MakeQuote();
+    data::RecordsetPtr quote = MakeQuote(lines);
     data::Recordset& rs = *quote;
     const auto t0 = Clock::now();
     int id = 0;
-    for (int line = 0; line < kQuoteLines; ++line) {
+    for (int line = 0; line < lines; ++line) {
       const std::string itemNo = std::to_string(100000 + line);
       const std::string script = Description(line);
       for (const char* category : {"R&R", "RA", "PAINT"}) {
@@ -279,7 +287,7 @@ void BM_QuoteFindAndWriteBaseline(benchmark::State& state) {
     }
     state.SetIterationTime(Seconds(t0, Clock::now()));
   }
-  state.counters["records"] = 3 * kQuoteLines;
+  state.counters["records"] = 3 * lines;
 }
 
 // ---- the 20,000-item schedule ----
@@ -376,30 +384,65 @@ void BM_ScheduleSearch(benchmark::State& state) {
   state.counters["found"] = found;
 }
 
-// Baseline: the same record set read from the catalogue, every field the
-// load uses, without a grid.
-void ReadSchedule(benchmark::State& state, bool decipher) {
+// The schedule query as the catalogue service runs it.
+constexpr const char* kLabourItemsSql =
+    "SELECT allow_tick, ItemNo, Script, rrhour, pthour FROM LABOUR_ITEM"
+    " WHERE schedule = ?1 AND sched_id = ?2"
+    " AND (body_id IS NULL OR body_id = '' OR body_id = ?3)"
+    " ORDER BY rowid";
+
+// Baseline: the same rows read with SQLite alone, every column's value
+// taken as a string or a number, and (with `decipher`) the enciphered
+// hours deciphered; no record set, no grid.
+void RawSchedule(benchmark::State& state, bool decipher) {
+  sqlite3* db = nullptr;
+  sqlite3_open_v2(UseCatalogue().Path().c_str(), &db, SQLITE_OPEN_READONLY, nullptr);
+  long rows = 0;
+  for (auto _ : state) {
+    const auto t0 = Clock::now();
+    sqlite3_stmt* st = nullptr;
+    sqlite3_prepare_v2(db, kLabourItemsSql, -1, &st, nullptr);
+    sqlite3_bind_int(st, 1, 0);
+    sqlite3_bind_text(st, 2, kBigSchedule, -1, SQLITE_STATIC);
+    sqlite3_bind_text(st, 3, "", -1, SQLITE_STATIC);
+    rows = 0;
+    while (sqlite3_step(st) == SQLITE_ROW) {
+      for (int c = 0; c < 5; ++c) {
+        if (sqlite3_column_type(st, c) == SQLITE_TEXT) {
+          std::string text(reinterpret_cast<const char*>(sqlite3_column_text(st, c)),
+                           static_cast<size_t>(sqlite3_column_bytes(st, c)));
+          if (decipher && c >= 3 && text.size() >= 16) text = cipher::DecryptField(text);
+          benchmark::DoNotOptimize(text);
+        } else {
+          benchmark::DoNotOptimize(sqlite3_column_double(st, c));
+        }
+      }
+      ++rows;
+    }
+    sqlite3_finalize(st);
+    state.SetIterationTime(Seconds(t0, Clock::now()));
+  }
+  sqlite3_close(db);
+  if (rows != kScheduleItems) state.SkipWithError("the query did not give the schedule");
+  state.counters["items"] = static_cast<double>(rows);
+}
+void BM_ScheduleSqliteStepBaseline(benchmark::State& state) { RawSchedule(state, false); }
+void BM_ScheduleSqliteDecipherBaseline(benchmark::State& state) { RawSchedule(state, true); }
+
+// GetLabourItems' record set of the same rows (the call alone).
+void BM_GetLabourItems(benchmark::State& state) {
   UseCatalogue();
   long rows = 0;
   for (auto _ : state) {
+    const auto t0 = Clock::now();
     data::RecordsetPtr rs;
     data::Catalogue()->GetLabourItems(rs, 0, kBigSchedule, "", "");
-    rows = 0;
-    for (; !rs->Eof(); rs->MoveNext(), ++rows) {
-      benchmark::DoNotOptimize(rs->Collect("ItemNo").ToText());
-      benchmark::DoNotOptimize(rs->Collect("Script").ToText());
-      benchmark::DoNotOptimize(rs->Collect("allow_tick").ToInt32());
-      for (const char* field : {"rrhour", "pthour"}) {
-        std::string hours = rs->Collect(field).ToText();
-        if (decipher && hours.size() >= 16) hours = cipher::DecryptField(hours);
-        benchmark::DoNotOptimize(hours);
-      }
-    }
+    rows = rs->RecordCount();
+    rs.reset();
+    state.SetIterationTime(Seconds(t0, Clock::now()));
   }
   state.counters["items"] = static_cast<double>(rows);
 }
-void BM_ScheduleReadBaseline(benchmark::State& state) { ReadSchedule(state, false); }
-void BM_ScheduleReadDecipherBaseline(benchmark::State& state) { ReadSchedule(state, true); }
 
 // Baseline: the grid's AddItem of the same rows.
 void BM_ScheduleGridAddItemBaseline(benchmark::State& state) {
@@ -416,38 +459,84 @@ void BM_ScheduleGridAddItemBaseline(benchmark::State& state) {
   state.counters["items"] = static_cast<double>(rows.size());
 }
 
-// Baseline: the search's scan of the filled grid (item numbers and
-// descriptions, without regard to case), counting the rows it would copy.
+// Baseline: a plain case-free substring scan of the same item numbers and
+// descriptions, held as strings.
 void BM_ScheduleSearchScanBaseline(benchmark::State& state) {
-  grid::FlexGrid g;
-  ShapeScheduleGrid(g);
-  for (const std::string& row : ScheduleRows())
-    g.AddItem(row);
+  std::vector<std::pair<std::string, std::string>> texts;
+  for (int i = 0; i < kScheduleItems; ++i)
+    texts.emplace_back(std::to_string(100000 + i), Description(i));
   const std::string needle = text::UCase(kSearchText);
   int found = 0;
   for (auto _ : state) {
-    found = 0;
-    for (int r = 2; r < g.Rows(); ++r) {
-      if (text::UCase(g.TextView(r, col::kItemNo)).find(needle) != std::string::npos ||
-          text::UCase(g.TextView(r, col::kDescription)).find(needle) != std::string::npos)
-        ++found;
-    }
+    const auto t0 = Clock::now();
+    found = bench::PlainScan(texts, needle);
     benchmark::DoNotOptimize(found);
+    state.SetIterationTime(Seconds(t0, Clock::now()));
   }
+  if (found != ExpectedMatches()) state.SkipWithError("the scan found the wrong rows");
   state.counters["found"] = found;
 }
 
 } // namespace
 
-BENCHMARK(BM_QuoteLoad)->UseManualTime()->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_QuoteSaveLabourChanges)->UseManualTime()->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_QuoteClose)->UseManualTime()->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_QuoteFindAndWriteBaseline)->UseManualTime()->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_ScheduleOpen)->UseManualTime()->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_ScheduleReadBaseline)->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_ScheduleReadDecipherBaseline)->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_ScheduleGridAddItemBaseline)->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_ScheduleSearch)->UseManualTime()->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_ScheduleSearchScanBaseline)->Unit(benchmark::kMillisecond);
+constexpr int kSmallQuote = 500, kQuote = 2000, kLargeQuote = 5000;
 
-BENCHMARK_MAIN();
+int main(int argc, char** argv) {
+  using bench::Measure;
+  auto sized = [](benchmark::internal::Benchmark* b) {
+    b->Arg(kSmallQuote)
+        ->Arg(kQuote)
+        ->Arg(kLargeQuote)
+        ->UseManualTime()
+        ->Unit(benchmark::kMillisecond);
+  };
+  benchmark::RegisterBenchmark("BM_QuoteLoad", BM_QuoteLoad)->Apply(sized);
+  benchmark::RegisterBenchmark("BM_QuoteSaveLabourChanges", BM_QuoteSaveLabourChanges)
+      ->Apply(sized);
+  benchmark::RegisterBenchmark("BM_QuoteClose", BM_QuoteClose)
+      ->Arg(kQuote)
+      ->UseManualTime()
+      ->Unit(benchmark::kMillisecond);
+  benchmark::RegisterBenchmark("BM_QuoteFindAndWriteBaseline", BM_QuoteFindAndWriteBaseline)
+      ->Apply(sized);
+  for (auto* b : {
+           benchmark::RegisterBenchmark("BM_ScheduleOpen", BM_ScheduleOpen),
+           benchmark::RegisterBenchmark("BM_ScheduleSqliteDecipherBaseline",
+                                        BM_ScheduleSqliteDecipherBaseline),
+           benchmark::RegisterBenchmark("BM_GetLabourItems", BM_GetLabourItems),
+           benchmark::RegisterBenchmark("BM_ScheduleSqliteStepBaseline",
+                                        BM_ScheduleSqliteStepBaseline),
+           benchmark::RegisterBenchmark("BM_ScheduleSearch", BM_ScheduleSearch),
+           benchmark::RegisterBenchmark("BM_ScheduleSearchScanBaseline",
+                                        BM_ScheduleSearchScanBaseline),
+       })
+    b->UseManualTime()->Unit(benchmark::kMillisecond);
+  benchmark::RegisterBenchmark("BM_ScheduleGridAddItemBaseline", BM_ScheduleGridAddItemBaseline)
+      ->Unit(benchmark::kMillisecond);
+
+  auto m = [](std::string name, std::string label = "") {
+    return Measure{std::move(name) + "/manual_time", "", std::move(label)};
+  };
+  auto quote = [](const char* what, int lines) {
+    return std::string(what) + "/" + std::to_string(lines);
+  };
+  bench::AddRatioGoal("Labour editor opens on 20,000 items (half enciphered)", m("BM_ScheduleOpen"),
+                      m("BM_ScheduleSqliteDecipherBaseline", "SQLite read + decipher"), 1.2);
+  bench::AddRatioGoal("GetLabourItems record set, 20,000 items", m("BM_GetLabourItems"),
+                      m("BM_ScheduleSqliteStepBaseline", "stepping the query"), 1.3);
+  bench::AddRatioGoal("Text search over 20,000 labour items", m("BM_ScheduleSearch"),
+                      m("BM_ScheduleSearchScanBaseline", "plain case-free scan"), 1.1);
+  bench::AddRatioGoal("Labour write-back, 2,000 lines (6,000 records), check included",
+                      m(quote("BM_QuoteSaveLabourChanges", kQuote)),
+                      m(quote("BM_QuoteFindAndWriteBaseline", kQuote), "Finds + writes once"), 1.5);
+  bench::AddRatioGoal("Labour Close (write-back and unload), 2,000 lines",
+                      m(quote("BM_QuoteClose", kQuote)),
+                      m(quote("BM_QuoteFindAndWriteBaseline", kQuote), "Finds + writes once"), 1.5);
+  bench::AddRatioGoal("Labour write-back grows linearly: 5,000 vs 500 lines",
+                      m(quote("BM_QuoteSaveLabourChanges", kLargeQuote)),
+                      m(quote("BM_QuoteSaveLabourChanges", kSmallQuote), "500 lines"), 11);
+  bench::AddRatioGoal("Labour quote load grows linearly: 5,000 vs 500 lines",
+                      m(quote("BM_QuoteLoad", kLargeQuote)),
+                      m(quote("BM_QuoteLoad", kSmallQuote), "500 lines"), 11);
+  return bench::RunWithGoals(argc, argv);
+}

@@ -14,7 +14,14 @@
 //   Search           one text search over the 100,000 available parts.
 //                    Baseline: a plain case-free substring scan of the same
 //                    item numbers and descriptions, held as strings.
-//   QuoteOpen        the editor opened on a quote of 500 parts.
+//   QuoteOpen        the editor opened on a quote of 500 or 5,000 parts.
+//   QuoteSave        SavePartsChanges on the same quotes, its all-or-nothing
+//                    check included. Baseline: the same Finds by ITEMID and
+//                    the same field writes (the values the write-back
+//                    stores) made directly on the record set, once.
+//
+// Baselines with SQLite alone step the same query the catalogue service
+// runs.
 //
 // Every benchmark times only its phase, in the calling thread's processor
 // time (manual time): the machines these run on are shared, and the wall
@@ -34,8 +41,12 @@
 #include "text/number.hpp"
 #include "text/strings.hpp"
 
+#include "bench_util.hpp"
+#include "goals.hpp"
+
 #include <benchmark/benchmark.h>
 #include <malloc.h>
+#include <sqlite3.h>
 #include <unistd.h>
 
 #include <array>
@@ -51,28 +62,16 @@ using namespace belvane;
 
 namespace {
 
-// The calling thread's processor time.
-struct Clock {
-  using time_point = std::chrono::nanoseconds;
-  static time_point now() {
-    timespec ts{};
-    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &ts);
-    return std::chrono::seconds(ts.tv_sec) + std::chrono::nanoseconds(ts.tv_nsec);
-  }
-};
+using Clock = bench::ThreadClock;
+using bench::Seconds;
 namespace cat = parts::col::cat;
-
-double Seconds(Clock::time_point from, Clock::time_point to) {
-  return std::chrono::duration<double>(to - from).count();
-}
 
 // A field key of the benchmark's own, so that no machine key file matters.
 constexpr const char* kFieldKey =
     "00112233445566778899AABBCCDDEEFF0123456789ABCDEFFEDCBA98765432100F1E2D3C";
 
 constexpr int kCatalogueParts = 100000;
-constexpr int kSmallParts = 40; // the vehicle of the 500-part quote
-constexpr int kQuoteParts = 500;
+constexpr int kSmallParts = 40;             // the vehicle of the 500-part quote
 constexpr const char* kBigModel = "1001";   // cat_no BIG
 constexpr const char* kSmallModel = "1002"; // cat_no SMALL
 // The searches: a common word (one part in twelve matches) and a rare
@@ -132,12 +131,16 @@ public:
     data::SetCatalogueLocation(path_);
   }
   ~BenchCatalogue() { std::filesystem::remove(path_); }
+  const std::string& Path() const { return path_; }
 
 private:
   std::string path_;
 };
 
-void UseCatalogue() { static BenchCatalogue catalogue; }
+const BenchCatalogue& UseCatalogue() {
+  static BenchCatalogue catalogue;
+  return catalogue;
+}
 
 // Heap bytes in use.
 size_t HeapInUse() {
@@ -219,28 +222,45 @@ void BM_CatalogueOpen(benchmark::State& state) {
   state.counters["retained_per_text"] = retainedPerText;
 }
 
-// Baseline: the same vehicle's parts read with SQLite alone, every field the
-// load shows, the enciphered ones deciphered; no grid.
+// Baseline: the same vehicle's parts read with SQLite alone, every column
+// taken as a string or a number, the enciphered ones (name, part number,
+// group) deciphered; no record set, no grid.
 void BM_CatalogueReadDecipherBaseline(benchmark::State& state) {
-  UseCatalogue();
+  sqlite3* db = nullptr;
+  sqlite3_open_v2(UseCatalogue().Path().c_str(), &db, SQLITE_OPEN_READONLY, nullptr);
+  const char* sql =
+      "SELECT ItemNo, PARTNAME, Script, SIDE, QTY, unitcost, partno, \"Group\" FROM VEHICLE_PART"
+      " WHERE cat_no = ?1 AND make = ?2 COLLATE NOCASE"
+      " AND (body_id IS NULL OR body_id = '' OR body_id = ?3)"
+      " AND (state IS NULL OR state = 0 OR state = ?4) ORDER BY rowid";
   long rows = 0;
   for (auto _ : state) {
     const auto t0 = Clock::now();
-    data::RecordsetPtr rs;
-    data::Catalogue()->GetVehicleParts(rs, "KESTREL", "BIG", "", 1);
+    sqlite3_stmt* st = nullptr;
+    sqlite3_prepare_v2(db, sql, -1, &st, nullptr);
+    sqlite3_bind_text(st, 1, "BIG", -1, SQLITE_STATIC);
+    sqlite3_bind_text(st, 2, "KESTREL", -1, SQLITE_STATIC);
+    sqlite3_bind_text(st, 3, "", -1, SQLITE_STATIC);
+    sqlite3_bind_int(st, 4, 1);
     rows = 0;
-    for (; !rs->Eof(); rs->MoveNext(), ++rows) {
-      benchmark::DoNotOptimize(rs->Collect("ItemNo").ToText());
-      benchmark::DoNotOptimize(cipher::DecryptField(rs->Collect("PARTNAME").ToText()));
-      benchmark::DoNotOptimize(rs->Collect("SIDE").ToText());
-      benchmark::DoNotOptimize(rs->Collect("QTY").ToText());
-      benchmark::DoNotOptimize(rs->Collect("unitcost").ToDouble());
-      benchmark::DoNotOptimize(cipher::DecryptField(rs->Collect("partno").ToText()));
-      benchmark::DoNotOptimize(cipher::DecryptField(rs->Collect("Group").ToText()));
+    while (sqlite3_step(st) == SQLITE_ROW) {
+      for (int c = 0; c < 8; ++c) {
+        if (sqlite3_column_type(st, c) == SQLITE_TEXT) {
+          std::string text(reinterpret_cast<const char*>(sqlite3_column_text(st, c)),
+                           static_cast<size_t>(sqlite3_column_bytes(st, c)));
+          if (c == 1 || c == 6 || c == 7) text = cipher::DecryptField(text);
+          benchmark::DoNotOptimize(text);
+        } else {
+          benchmark::DoNotOptimize(sqlite3_column_double(st, c));
+        }
+      }
+      ++rows;
     }
-    rs.reset();
+    sqlite3_finalize(st);
     state.SetIterationTime(Seconds(t0, Clock::now()));
   }
+  sqlite3_close(db);
+  if (rows != kCatalogueParts) state.SkipWithError("the query did not give the catalogue");
   state.counters["parts"] = static_cast<double>(rows);
 }
 
@@ -290,19 +310,10 @@ void BM_SearchScanBaseline(benchmark::State& state) {
     texts.emplace_back(ItemNo(i), side == "O" ? PartName(i) : side + "/H " + PartName(i));
   }
   const std::string needle = text::UCase(searchText);
-  auto contains = [&needle](const std::string& s) {
-    const auto it =
-        std::search(s.begin(), s.end(), needle.begin(), needle.end(), [](char a, char b) {
-          return (a >= 'a' && a <= 'z' ? static_cast<char>(a - 32) : a) == b;
-        });
-    return it != s.end();
-  };
   int found = 0;
   for (auto _ : state) {
     const auto t0 = Clock::now();
-    found = 0;
-    for (const auto& [item, desc] : texts)
-      if (contains(item) || contains(desc)) ++found;
+    found = bench::PlainScan(texts, needle);
     benchmark::DoNotOptimize(found);
     state.SetIterationTime(Seconds(t0, Clock::now()));
   }
@@ -310,13 +321,13 @@ void BM_SearchScanBaseline(benchmark::State& state) {
   state.counters["found"] = found;
 }
 
-// ---- the 500-part quote ----
+// ---- the quotes ----
 
-data::RecordsetPtr MakeQuote() {
+data::RecordsetPtr MakeQuote(int parts) {
   data::RecordsetPtr quote = data::QuoteStore::NewItemRecordset();
   data::Recordset& rs = *quote;
   const std::array<const char*, 5> marks = {"", "U", "X", "C", "A"};
-  for (int i = 0; i < kQuoteParts; ++i) {
+  for (int i = 0; i < parts; ++i) {
     rs.AddNew();
     rs.Collect("ITEMID", data::Value(int32_t(i + 1)));
     rs.Collect("DELITEM", data::Value(false));
@@ -341,10 +352,11 @@ data::RecordsetPtr MakeQuote() {
 
 void BM_QuoteOpen(benchmark::State& state) {
   UseCatalogue();
+  const int parts = static_cast<int>(state.range(0));
   forms::SimulatedUser user;
   int rows = 0;
   for (auto _ : state) {
-    data::RecordsetPtr quote = MakeQuote();
+    data::RecordsetPtr quote = MakeQuote(parts);
     double seconds = 0;
     const auto opened = Clock::now();
     if (!Session(state, quote, kSmallModel, [&](parts::frmParts& f) {
@@ -355,16 +367,112 @@ void BM_QuoteOpen(benchmark::State& state) {
       break;
     state.SetIterationTime(seconds);
   }
-  if (rows != kQuoteParts) state.SkipWithError("the quote's parts did not load");
+  if (rows != parts) state.SkipWithError("the quote's parts did not load");
   state.counters["parts"] = rows;
+}
+
+// The field writes SavePartsChanges makes: the fields it writes, with the
+// values a save of the quote stores in them.
+const std::vector<const char*> kWrittenFields = {
+    "DELITEM", "qtnno",    "subquote", "Category", "itemno",    "script", "side", "mark",
+    "qty",     "unitcost", "rrhour",   "partno",   "report_on", "Rev",    "tag"};
+
+void BM_QuoteSave(benchmark::State& state) {
+  UseCatalogue();
+  const int parts = static_cast<int>(state.range(0));
+  for (auto _ : state) {
+    data::RecordsetPtr quote = MakeQuote(parts);
+    double seconds = 0;
+    if (!Session(state, quote, kSmallModel, [&](parts::frmParts& f) {
+          const auto t0 = Clock::now();
+          CForms().SavePartsChanges();
+          seconds = Seconds(t0, Clock::now());
+          forms::SimulatedUser().Click(f.cmdClose);
+        }))
+      break;
+    if (quote->RecordCount() != parts) {
+      state.SkipWithError("the write-back did not give the expected records");
+      break;
+    }
+    state.SetIterationTime(seconds);
+  }
+  state.counters["records"] = parts;
+}
+
+void BM_QuoteSaveFindAndWriteBaseline(benchmark::State& state) {
+  UseCatalogue();
+  const int parts = static_cast<int>(state.range(0));
+  // What the write-back stores, taken from one real save (untimed).
+  std::vector<std::vector<data::Value>> stored;
+  {
+    data::RecordsetPtr saved = MakeQuote(parts);
+    if (!Session(state, saved, kSmallModel, [&](parts::frmParts& f) {
+          CForms().SavePartsChanges();
+          forms::SimulatedUser().Click(f.cmdClose);
+        }))
+      return;
+    for (saved->MoveFirst(); !saved->Eof(); saved->MoveNext()) {
+      std::vector<data::Value> values;
+      for (const char* field : kWrittenFields)
+        values.push_back(saved->Collect(field));
+      stored.push_back(std::move(values));
+    }
+  }
+  for (auto _ : state) {
+    data::RecordsetPtr quote = MakeQuote(parts);
+    data::Recordset& rs = *quote;
+    const auto t0 = Clock::now();
+    for (int i = 0; i < parts; ++i) {
+      rs.Find("ITEMID = " + std::to_string(i + 1), 0, data::adSearchForward, data::adBookmarkFirst);
+      const auto& values = stored[static_cast<size_t>(i)];
+      for (size_t k = 0; k < kWrittenFields.size(); ++k)
+        rs.Collect(kWrittenFields[k], values[k]);
+    }
+    state.SetIterationTime(Seconds(t0, Clock::now()));
+  }
+  state.counters["records"] = parts;
 }
 
 } // namespace
 
-BENCHMARK(BM_CatalogueOpen)->UseManualTime()->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_CatalogueReadDecipherBaseline)->UseManualTime()->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_Search)->DenseRange(0, 1)->UseManualTime()->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_SearchScanBaseline)->DenseRange(0, 1)->UseManualTime()->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_QuoteOpen)->UseManualTime()->Unit(benchmark::kMillisecond);
+int main(int argc, char** argv) {
+  using bench::Measure;
+  constexpr int kSmallQuote = 500, kLargeQuote = 5000;
+  auto ms = [](benchmark::internal::Benchmark* b) {
+    b->UseManualTime()->Unit(benchmark::kMillisecond);
+  };
+  benchmark::RegisterBenchmark("BM_CatalogueOpen", BM_CatalogueOpen)->Apply(ms);
+  benchmark::RegisterBenchmark("BM_CatalogueReadDecipherBaseline", BM_CatalogueReadDecipherBaseline)
+      ->Apply(ms);
+  benchmark::RegisterBenchmark("BM_Search", BM_Search)->DenseRange(0, 1)->Apply(ms);
+  benchmark::RegisterBenchmark("BM_SearchScanBaseline", BM_SearchScanBaseline)
+      ->DenseRange(0, 1)
+      ->Apply(ms);
+  for (const char* name : {"BM_QuoteOpen", "BM_QuoteSave", "BM_QuoteSaveFindAndWriteBaseline"}) {
+    auto* fn = std::string(name) == "BM_QuoteOpen"   ? BM_QuoteOpen
+               : std::string(name) == "BM_QuoteSave" ? BM_QuoteSave
+                                                     : BM_QuoteSaveFindAndWriteBaseline;
+    benchmark::RegisterBenchmark(name, fn)->Arg(kSmallQuote)->Arg(kLargeQuote)->Apply(ms);
+  }
 
-BENCHMARK_MAIN();
+  auto m = [](std::string name, std::string label = "") {
+    return Measure{std::move(name) + "/manual_time", "", std::move(label)};
+  };
+  bench::AddRatioGoal("Parts editor opens on 100,000 parts (names, numbers, groups enciphered)",
+                      m("BM_CatalogueOpen"),
+                      m("BM_CatalogueReadDecipherBaseline", "SQLite read + decipher"), 1.2);
+  bench::AddValueGoal("Parts editor memory over the catalogue's text",
+                      Measure{"BM_CatalogueOpen/manual_time", "retained_per_text", ""}, 2.0,
+                      bench::Limit::AtMost, "x");
+  bench::AddRatioGoal("Text search over 100,000 parts, common word (8,334 hits)", m("BM_Search/0"),
+                      m("BM_SearchScanBaseline/0", "plain case-free scan"), 1.1);
+  bench::AddRatioGoal("Text search over 100,000 parts, rare text (77 hits)", m("BM_Search/1"),
+                      m("BM_SearchScanBaseline/1", "plain case-free scan"), 1.1);
+  bench::AddRatioGoal("Parts write-back, 5,000 parts, check included", m("BM_QuoteSave/5000"),
+                      m("BM_QuoteSaveFindAndWriteBaseline/5000", "Finds + writes once"), 1.5);
+  bench::AddRatioGoal("Parts write-back grows linearly: 5,000 vs 500 parts", m("BM_QuoteSave/5000"),
+                      m("BM_QuoteSave/500", "500 parts"), 11);
+  bench::AddRatioGoal("Parts quote load grows linearly: 5,000 vs 500 parts", m("BM_QuoteOpen/5000"),
+                      m("BM_QuoteOpen/500", "500 parts"), 11);
+  return bench::RunWithGoals(argc, argv);
+}

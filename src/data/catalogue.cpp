@@ -13,6 +13,37 @@ namespace belvane::data {
 
 namespace {
 
+// Hands every record of an open record set to `row`, its values in field
+// order, until `row` asks to stop.
+void EachRecord(Recordset& rs, const CatalogueDataObject::RowSink& row) {
+  std::vector<Value> values(rs.Fields().Count());
+  for (; !rs.Eof(); rs.MoveNext()) {
+    for (size_t i = 0; i < values.size(); ++i)
+      values[i] = rs.Fields(i).Value();
+    if (!row(values)) return;
+  }
+}
+
+} // namespace
+
+void CatalogueDataObject::ForEachLabourItem(long schedule, const std::string& firstId,
+                                            const std::string& secondId, const std::string& bodyId,
+                                            const RowSink& row) {
+  RecordsetPtr rs;
+  GetLabourItems(rs, schedule, firstId, secondId, bodyId);
+  EachRecord(*rs, row);
+}
+
+void CatalogueDataObject::ForEachVehiclePart(const std::string& make, const std::string& catNo,
+                                             const std::string& bodyId, int16_t state,
+                                             const RowSink& row) {
+  RecordsetPtr rs;
+  GetVehicleParts(rs, make, catNo, bodyId, state);
+  EachRecord(*rs, row);
+}
+
+namespace {
+
 std::mutex gLocationMutex;
 std::optional<std::string> gLocation; // set by the host; guarded by gLocationMutex
 // Bumped on every SetCatalogueLocation so that each thread notices that its

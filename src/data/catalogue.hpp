@@ -11,8 +11,10 @@
 #include "data/recordset.hpp"
 
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
+#include <vector>
 
 namespace belvane {
 namespace err {
@@ -70,6 +72,20 @@ public:
   // True when the make (without regard to case or surrounding blanks) has a
   // clickable vehicle diagram.
   virtual bool HasVehicleDiagram(const std::string& make) = 0;
+
+  // The rows GetLabourItems and GetVehicleParts give, with the same
+  // arguments and errors, handed to `row` one at a time as they are read
+  // (the values in the order of the fields named there) instead of being
+  // held in a record set: for a loader that reads each row once. `row`
+  // returns false to stop early. The values are those a record set would
+  // hold before converting them to a field type. These defaults read the
+  // record sets; a service that can stream its rows does so.
+  using RowSink = std::function<bool(const std::vector<Value>& row)>;
+  virtual void ForEachLabourItem(long schedule, const std::string& firstId,
+                                 const std::string& secondId, const std::string& bodyId,
+                                 const RowSink& row);
+  virtual void ForEachVehiclePart(const std::string& make, const std::string& catNo,
+                                  const std::string& bodyId, int16_t state, const RowSink& row);
 };
 
 // The calling thread's catalogue data service: the object handed over with

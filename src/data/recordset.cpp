@@ -74,6 +74,32 @@ struct SortKey {
 
 // --- FieldCollection ------------------------------------------------------
 
+namespace {
+
+char FoldAscii(char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - ('a' - 'A')) : c; }
+
+// A hash of the name with ASCII letters folded, from its length and three
+// of its bytes: cheap for the short names record sets have, and the table
+// sorts out the few names it does not tell apart.
+uint32_t NameHash(std::string_view name) {
+  if (name.empty()) return 0;
+  auto at = [&name](size_t i) {
+    return static_cast<uint32_t>(static_cast<unsigned char>(FoldAscii(name[i])));
+  };
+  uint32_t h = static_cast<uint32_t>(name.size()) * 0x9E3779B1u;
+  h ^= at(0) << 16 ^ at(name.size() - 1) << 8 ^ at(name.size() / 2);
+  h *= 0x85EBCA6Bu;
+  return h ^ (h >> 15);
+}
+
+bool IsAscii(std::string_view s) {
+  for (char c : s)
+    if (static_cast<unsigned char>(c) >= 0x80) return false;
+  return true;
+}
+
+} // namespace
+
 void FieldCollection::Append(std::string name, DataType type, long definedSize, long attributes) {
   if (owner_.open_ || !owner_.records_.empty())
     throw Error(3219,
@@ -82,10 +108,42 @@ void FieldCollection::Append(std::string name, DataType type, long definedSize, 
                 kSource);
   if (name.empty()) throw Error(err::kBadArguments, "A field needs a name", kSource);
   std::string key = FoldName(name);
-  if (byName_.count(key))
+  if (IndexOf(key))
     throw Error(err::kBadArguments, "The record set already has a field \"" + name + "\"", kSource);
-  byName_.emplace(std::move(key), defs_.size());
+  upper_.push_back(std::move(key));
   defs_.push_back(FieldDef{std::move(name), type, definedSize, attributes});
+  // Keep the table at most half full.
+  if (slots_.size() < 2 * defs_.size()) {
+    size_t size = 8;
+    while (size < 2 * defs_.size())
+      size *= 2;
+    slots_.assign(size, -1);
+    for (size_t i = 0; i + 1 < defs_.size(); ++i) {
+      size_t slot = NameHash(upper_[i]) & (size - 1);
+      while (slots_[slot] >= 0)
+        slot = (slot + 1) & (size - 1);
+      slots_[slot] = static_cast<int32_t>(i);
+    }
+  }
+  size_t slot = NameHash(upper_.back()) & (slots_.size() - 1);
+  while (slots_[slot] >= 0)
+    slot = (slot + 1) & (slots_.size() - 1);
+  slots_[slot] = static_cast<int32_t>(defs_.size() - 1);
+}
+
+std::optional<size_t> FieldCollection::Lookup(std::string_view name, bool foldAscii) const {
+  if (slots_.empty()) return std::nullopt;
+  const size_t mask = slots_.size() - 1;
+  for (size_t slot = NameHash(name) & mask; slots_[slot] >= 0; slot = (slot + 1) & mask) {
+    const auto index = static_cast<size_t>(slots_[slot]);
+    const std::string& upper = upper_[index];
+    if (upper.size() != name.size()) continue;
+    bool same = true;
+    for (size_t i = 0; i < name.size() && same; ++i)
+      same = (foldAscii ? FoldAscii(name[i]) : name[i]) == upper[i];
+    if (same) return index;
+  }
+  return std::nullopt;
 }
 
 const FieldDef& FieldCollection::Item(size_t index) const {
@@ -99,9 +157,10 @@ const FieldDef& FieldCollection::Item(size_t index) const {
 }
 
 std::optional<size_t> FieldCollection::IndexOf(std::string_view name) const {
-  auto it = byName_.find(FoldName(name));
-  if (it == byName_.end()) return std::nullopt;
-  return it->second;
+  // Field names are ASCII words as a rule: their letters fold as they are
+  // compared. Anything else takes the full case mapping first.
+  if (IsAscii(name)) return Lookup(name, true);
+  return Lookup(FoldName(name), false);
 }
 
 // --- Field ----------------------------------------------------------------
@@ -175,21 +234,29 @@ void Recordset::Collect(std::string_view name, const Value& v) {
 void Recordset::WriteField(size_t field, const Value& v) {
   Record& rec = Current();
   const FieldDef& def = fields_.defs_[field];
+  // A value of the field's own type is compared and copied as it is.
+  const bool asItIs = v.IsNull() || HoldsType(v, def.type);
   Value converted;
-  try {
-    converted = v.ConvertTo(def.type);
-  } catch (const Error& e) {
-    throw Error(e.Number(),
-                "Field \"" + def.name + "\" (" + DataTypeName(def.type) + "): " + e.Description(),
-                kSource);
+  if (!asItIs) {
+    try {
+      converted = v.ConvertTo(def.type);
+    } catch (const Error& e) {
+      throw Error(e.Number(),
+                  "Field \"" + def.name + "\" (" + DataTypeName(def.type) + "): " + e.Description(),
+                  kSource);
+    }
   }
-  if (rec.values[field] == converted) return;
+  const Value& wanted = asItIs ? v : converted;
+  if (rec.values[field] == wanted) return;
   if (rec.status == RecordStatus::Unchanged) {
     rec.original = std::make_unique<std::vector<Value>>(rec.values);
     rec.status = RecordStatus::Modified;
   }
-  rec.values[field] = std::move(converted);
-  index_.erase(field);
+  if (asItIs)
+    rec.values[field] = v;
+  else
+    rec.values[field] = std::move(converted);
+  if (!index_.empty()) index_.erase(field);
 }
 
 void Recordset::Open() {
@@ -287,8 +354,11 @@ void Recordset::AppendLoaded(std::vector<Value> values) {
                     std::to_string(fields_.Count()) + " fields",
                 kSource);
   for (size_t i = 0; i < values.size(); ++i) {
-    if (fields_.defs_[i].type != DataType::Variant && !values[i].IsNull())
-      values[i] = values[i].ConvertTo(fields_.defs_[i].type);
+    // A value of the field's own type (what a store reads, nearly always)
+    // is kept as it is: no copy of its text.
+    const DataType type = fields_.defs_[i].type;
+    if (type != DataType::Variant && !values[i].IsNull() && !HoldsType(values[i], type))
+      values[i] = values[i].ConvertTo(type);
   }
   Record rec;
   rec.values = std::move(values);
@@ -296,8 +366,14 @@ void Recordset::AppendLoaded(std::vector<Value> values) {
   viewPos_.push_back(static_cast<int64_t>(view_.size()));
   view_.push_back(static_cast<uint32_t>(records_.size() - 1));
   ++liveInView_;
-  index_.clear();
+  if (!index_.empty()) index_.clear();
   if (pos_ >= static_cast<long>(view_.size()) - 1 && liveInView_ == 1) pos_ = 0;
+}
+
+void Recordset::ReserveRecords(size_t count) {
+  records_.reserve(count);
+  view_.reserve(count);
+  viewPos_.reserve(count);
 }
 
 void Recordset::Delete(AffectEnum affect) {
@@ -528,6 +604,18 @@ void Recordset::StoredAssign(size_t record, size_t field, const Value& v) {
     throw Error(err::kSubscript, "Subscript out of range", kSource);
   records_[record].values[field] = v.ConvertTo(fields_.defs_[field].type);
   index_.erase(field);
+}
+
+size_t Recordset::CurrentStored() const {
+  Current();
+  return view_[static_cast<size_t>(pos_)];
+}
+
+bool Recordset::MoveToStored(size_t record) {
+  RequireOpen();
+  if (record >= records_.size() || !records_[record].Live() || viewPos_[record] < 0) return false;
+  pos_ = static_cast<long>(viewPos_[record]);
+  return true;
 }
 
 void Recordset::AcceptChanges() {

@@ -58,7 +58,12 @@ private:
   friend class Field;
   Recordset& owner_;
   std::vector<FieldDef> defs_;
-  std::unordered_map<std::string, size_t> byName_; // upper-case name -> index
+  // Names are found through a small open-addressed table of indexes into
+  // defs_, hashed on the name with ASCII letters folded, so a look-up by a
+  // literal neither allocates nor folds a copy.
+  std::optional<size_t> Lookup(std::string_view folded, bool foldAscii) const;
+  std::vector<std::string> upper_; // each field's name in upper case
+  std::vector<int32_t> slots_;     // -1: empty
 };
 
 // A field of the current record.
@@ -145,6 +150,9 @@ public:
   // Values are converted to the field types. Used to fill a record set from
   // a store.
   void AppendLoaded(std::vector<data::Value> values);
+  // Room for `count` records in all, so that a store filling the record set
+  // does not grow it step by step.
+  void ReserveRecords(size_t count);
   // Every record ever held, deleted ones included, in load order.
   size_t StoredCount() const { return records_.size(); }
   RecordStatus StoredStatus(size_t record) const;
@@ -153,6 +161,12 @@ public:
   // Sets a value of a stored record without changing its state (a store
   // writing back the id it assigned).
   void StoredAssign(size_t record, size_t field, const data::Value& v);
+  // The stored index of the current record, and back to it: a caller that
+  // found a record once returns to it without searching again. MoveToStored
+  // returns false, the cursor unchanged, when the record is deleted or not
+  // in the current view.
+  size_t CurrentStored() const;
+  bool MoveToStored(size_t record);
   // Marks the present state as stored: changed and new records become
   // unchanged, deleted ones are dropped. Moves to the first record.
   void AcceptChanges();

@@ -160,6 +160,24 @@ Value Value::ConvertTo(DataType type) const {
   return *this;
 }
 
+bool HoldsType(const Value& v, DataType type) {
+  switch (type) {
+  case DataType::SmallInt:
+    return v.Type() == ValueType::Integer;
+  case DataType::Integer:
+    return v.Type() == ValueType::Long;
+  case DataType::Double:
+    return v.Type() == ValueType::Double;
+  case DataType::Boolean:
+    return v.Type() == ValueType::Boolean;
+  case DataType::VarWChar:
+    return v.Type() == ValueType::Text;
+  case DataType::Variant:
+    return true;
+  }
+  return false;
+}
+
 std::weak_ordering CompareValues(const Value& a, const Value& b) {
   if (a.IsNull() || b.IsNull()) {
     if (a.IsNull() && b.IsNull()) return std::weak_ordering::equivalent;

@@ -70,6 +70,10 @@ private:
   std::variant<Null, bool, int16_t, int32_t, double, std::string> v_;
 };
 
+// Whether a value already has the type a field of `type` holds (Variant
+// holds any value): converting it to that type would change nothing.
+bool HoldsType(const Value& v, DataType type);
+
 // Orders two values as a sort or a criterion compares them: Null first,
 // numbers (and Booleans) numerically, texts without regard to case; a
 // number against a text compares as numbers when the text is numeric, else

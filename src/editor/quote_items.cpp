@@ -51,43 +51,62 @@ bool FindItemId(data::Recordset& items, const std::string& id) {
   return !items.Eof();
 }
 
-void CheckWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& plan,
-                    const std::vector<std::string>& removedIds, const WriteBackWords& words) {
-  for (const PlannedRecord& p : plan) {
-    const std::string where = words.describeRow(p.row);
+WriteBackTargets CheckWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& plan,
+                                const std::vector<std::string>& removedIds,
+                                const WriteBackWords& words) {
+  WriteBackTargets targets(plan.size());
+  // A record set's field index and type for each field name met, found
+  // once per write-back rather than once per write.
+  std::vector<std::pair<const char*, std::optional<size_t>>> fieldsSeen;
+  auto fieldIndex = [&](const char* field) {
+    for (const auto& [name, index] : fieldsSeen)
+      if (name == field) return index;
+    fieldsSeen.emplace_back(field, items.Fields().IndexOf(field));
+    return fieldsSeen.back().second;
+  };
+  for (size_t i = 0; i < plan.size(); ++i) {
+    const PlannedRecord& p = plan[i];
+    // The row is described only for a message.
+    auto where = [&] { return words.describeRow(p.row); };
     if (!p.id.empty()) {
-      const std::string cell = where + ", column \"" + p.idTitle + "\"";
+      auto cell = [&] { return where() + ", column \"" + p.idTitle + "\""; };
       if (!IsItemId(p.id))
         throw Error(err::kTypeMismatch,
-                    cell + ": \"" + p.id +
+                    cell() + ": \"" + p.id +
                         "\" is not the number of a stored record. Nothing was saved; delete "
                         "the line and add it again.",
                     words.source);
-      const bool removedBefore =
-          std::find(removedIds.begin(), removedIds.end(), p.id) != removedIds.end();
-      if (p.kind == PlannedRecord::Kind::Write && (removedBefore || !FindItemId(items, p.id)))
-        throw Error(err::kNoCurrentRecord,
-                    cell + ": its stored " + p.what + " record (" + p.id +
-                        ") is no longer in the quote. Nothing was saved; delete the line and "
-                        "add it again.",
-                    words.source);
+      if (p.kind == PlannedRecord::Kind::Write) {
+        const bool removedBefore =
+            std::find(removedIds.begin(), removedIds.end(), p.id) != removedIds.end();
+        if (removedBefore || !FindItemId(items, p.id))
+          throw Error(err::kNoCurrentRecord,
+                      cell() + ": its stored " + p.what + " record (" + p.id +
+                          ") is no longer in the quote. Nothing was saved; delete the line and "
+                          "add it again.",
+                      words.source);
+        targets[i] = items.CurrentStored();
+      }
     }
     for (const FieldWrite& w : p.writes) {
-      auto index = items.Fields().IndexOf(w.field);
+      const std::optional<size_t> index = fieldIndex(w.field);
       if (!index)
         throw Error(err::kItemNotFound,
-                    where + ": the quote has nowhere to keep the line's " + w.field +
+                    where() + ": the quote has nowhere to keep the line's " + w.field +
                         " (its record set has no such field). Nothing was saved; the quoting "
                         "program must be corrected.",
                     words.source);
       try {
-        (void)w.value.ConvertTo(items.Fields().Item(*index).type);
+        // Only a value of another type can be refused.
+        const data::DataType type = items.Fields().Item(*index).type;
+        if (!w.value.IsNull() && !data::HoldsType(w.value, type)) (void)w.value.ConvertTo(type);
       } catch (const Error& e) {
-        throw Error(e.Number(), where + ": " + words.refusedValue(w) + " Nothing was saved.",
+        throw Error(e.Number(), where() + ": " + words.refusedValue(w) + " Nothing was saved.",
                     words.source);
       }
     }
   }
+  return targets;
 }
 
 void DropSessionRecords(data::Recordset& items) {
@@ -103,18 +122,30 @@ void ApplyRemovals(data::Recordset& items, const std::vector<std::string>& remov
     if (FindItemId(items, id)) items.Delete();
 }
 
-void ApplyWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& plan) {
-  for (const PlannedRecord& p : plan) {
+void ApplyWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& plan,
+                    const WriteBackTargets* targets) {
+  // Each field name's index, found once per write-back.
+  std::vector<std::pair<const char*, size_t>> fieldsSeen;
+  auto field = [&](const char* name) {
+    for (const auto& [seen, index] : fieldsSeen)
+      if (seen == name) return items.Fields(index);
+    const data::Field f = items.Fields(name);
+    fieldsSeen.emplace_back(name, *items.Fields().IndexOf(name));
+    return f;
+  };
+  for (size_t i = 0; i < plan.size(); ++i) {
+    const PlannedRecord& p = plan[i];
     if (p.kind == PlannedRecord::Kind::Delete) {
       if (FindItemId(items, p.id)) items.Delete();
       continue;
     }
     if (p.id.empty())
       items.AddNew();
-    else
+    else if (!(targets && i < targets->size() && (*targets)[i] &&
+               items.MoveToStored(*(*targets)[i])))
       FindItemId(items, p.id);
     for (const FieldWrite& w : p.writes)
-      items.Collect(w.field, w.value);
+      field(w.field).SetValue(w.value);
   }
 }
 

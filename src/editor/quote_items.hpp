@@ -7,6 +7,7 @@
 
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -57,12 +58,18 @@ struct WriteBackWords {
   const char* source;
 };
 
+// The stored record each planned write found while it was checked (as
+// Recordset::CurrentStored counts), so the write-back goes straight back to
+// it; nothing for a new record or a deletion.
+using WriteBackTargets = std::vector<std::optional<size_t>>;
+
 // Checks every planned record against the record set before anything is
 // written: ids that are not ids, stored records that are gone (or were
 // removed this session), fields the record set lacks and values it cannot
 // hold all raise an error naming the row and cell; nothing has changed.
-void CheckWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& plan,
-                    const std::vector<std::string>& removedIds, const WriteBackWords& words);
+WriteBackTargets CheckWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& plan,
+                                const std::vector<std::string>& removedIds,
+                                const WriteBackWords& words);
 
 // Pass 1: deletes the records added earlier in this session (no ITEMID),
 // so the grid's new lines are not appended twice. Hidden records ("D") and
@@ -70,7 +77,10 @@ void CheckWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& pl
 void DropSessionRecords(data::Recordset& items);
 // Pass 2: deletes the stored records whose lines the estimator removed.
 void ApplyRemovals(data::Recordset& items, const std::vector<std::string>& removedIds);
-// Pass 3: the planned writes and deletions, in order.
-void ApplyWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& plan);
+// Pass 3: the planned writes and deletions, in order. With the targets the
+// check found, a write returns to its record without a search (a record
+// deleted since is searched for as without them).
+void ApplyWriteBack(data::Recordset& items, const std::vector<PlannedRecord>& plan,
+                    const WriteBackTargets* targets = nullptr);
 
 } // namespace belvane::editor

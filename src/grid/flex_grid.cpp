@@ -268,11 +268,6 @@ void FlexGrid::MoveTo(int row, int col) {
 
 // ---- texts ----
 
-std::string_view FlexGrid::TextView(int row, int col) const {
-  CheckCell(row, col);
-  return CellText(rows_[static_cast<std::size_t>(row)].cells, col, cols_);
-}
-
 std::string FlexGrid::TextMatrix(int row, int col) const { return std::string(TextView(row, col)); }
 
 void FlexGrid::TextMatrix(int row, int col, std::string_view text) {
@@ -306,6 +301,34 @@ void FlexGrid::FillRow(RowData& row, std::string_view item) const {
 void FlexGrid::AddItem(std::string_view item) {
   RowData row;
   FillRow(row, item);
+  rows_.push_back(std::move(row));
+  const int index = Rows() - 1;
+  Notify([index](ModelObserver& o) { o.RowsInserted(index, 1); });
+}
+
+void FlexGrid::AddItemFrom(const FlexGrid& source, int sourceRow, int count,
+                           std::string_view next) {
+  source.CheckRow(sourceRow);
+  if (count < 0 || count > source.cols_) throw Error(err::kInvalidColValue, "Invalid Col value");
+  const int copied = std::min(count, cols_);
+  const std::string& from = source.rows_[static_cast<std::size_t>(sourceRow)].cells;
+  const std::uint32_t copiedBytes = from.empty() || copied == 0 ? 0 : EndOf(from, copied - 1);
+  const std::size_t nextBytes = copied < cols_ ? next.size() : 0;
+  const std::size_t total = copiedBytes + nextBytes;
+  if (total > kMaxRowText) throw Error(err::kOverflow, "Overflow: row text too long");
+  RowData row;
+  if (total != 0) {
+    // The copied cells keep their end offsets; the next cell and every
+    // empty one after it end where the texts end.
+    std::string packed(HeaderBytes(cols_) + total, '\0');
+    if (!from.empty()) std::memcpy(packed.data(), from.data(), HeaderBytes(copied));
+    for (int k = copied; k < cols_; ++k)
+      SetEndOf(packed, k, static_cast<std::uint32_t>(total));
+    char* texts = packed.data() + HeaderBytes(cols_);
+    if (copiedBytes != 0) std::memcpy(texts, from.data() + HeaderBytes(source.cols_), copiedBytes);
+    if (nextBytes != 0) std::memcpy(texts + copiedBytes, next.data(), nextBytes);
+    row.cells = std::move(packed);
+  }
   rows_.push_back(std::move(row));
   const int index = Rows() - 1;
   Notify([index](ModelObserver& o) { o.RowsInserted(index, 1); });

@@ -19,6 +19,8 @@
 
 #include "grid/control_model.hpp"
 
+#include <cstdint>
+#include <cstring>
 #include <functional>
 #include <memory>
 #include <string>
@@ -80,14 +82,31 @@ public:
   void Text(std::string_view text) { TextMatrix(row_, col_, text); }
   std::string TextMatrix(int row, int col) const;
   void TextMatrix(int row, int col, std::string_view text);
-  // The text without a copy; valid until the grid next changes.
-  std::string_view TextView(int row, int col) const;
+  // The text without a copy; valid until the grid next changes. Inline:
+  // searches and views read every cell they show through it.
+  std::string_view TextView(int row, int col) const {
+    if (row < 0 || row >= Rows() || col < 0 || col >= cols_) CheckCell(row, col); // raises
+    const std::string& packed = rows_[static_cast<std::size_t>(row)].cells;
+    if (packed.empty()) return {};
+    std::uint32_t begin = 0, end = 0;
+    const char* offsets = packed.data();
+    if (col > 0) std::memcpy(&begin, offsets + (col - 1) * sizeof begin, sizeof begin);
+    std::memcpy(&end, offsets + col * sizeof end, sizeof end);
+    return std::string_view(packed.data() + static_cast<std::size_t>(cols_) * sizeof end + begin,
+                            end - begin);
+  }
 
   // Appends a row, or inserts it before `index` (1 to Rows()). Fields are
   // separated by tabs: field k goes to column k, missing fields leave cells
   // empty, fields beyond the last column are dropped.
   void AddItem(std::string_view item);
   void AddItem(std::string_view item, int index);
+  // Appends a row whose first `count` cells are those of `source`'s row
+  // `sourceRow` (any row, the header too), whose next cell holds `next`
+  // and whose other cells are empty: the same row AddItem makes of those
+  // texts joined by tabs, copied without splitting them again. Cells past
+  // this grid's last column are dropped. `source` may be this grid.
+  void AddItemFrom(const FlexGrid& source, int sourceRow, int count, std::string_view next);
   // Removes a data row (1 to Rows() - 1); rows below move up. Removing the
   // last data row leaves the header alone.
   void RemoveItem(int index);

@@ -10,33 +10,74 @@
 #include "text/number.hpp"
 #include "text/strings.hpp"
 
+#include <charconv>
 #include <optional>
 #include <string>
+#include <string_view>
+#include <vector>
 
 namespace belvane::labour {
 
 namespace {
 
+using HoursFormatter = text::NumberTexts;
+
+// The number a deciphered hours text holds: written with "." whatever the
+// reader's locale. Plain digits with one point are read directly; anything
+// else goes through the general reader under that locale.
+std::optional<double> StoredNumber(const std::string& plain) {
+  const char* first = plain.data();
+  const char* last = first + plain.size();
+  bool simple = !plain.empty();
+  int points = 0;
+  for (const char* p = first; p != last && simple; ++p) {
+    if (*p == '.')
+      simple = ++points <= 1;
+    else
+      simple = (*p >= '0' && *p <= '9') || (*p == '-' && p == first && p + 1 != last);
+  }
+  if (simple && plain != "." && plain != "-.") {
+    double n = 0;
+    if (const auto r = std::from_chars(first, last, n); r.ec == std::errc() && r.ptr == last)
+      return n;
+  }
+  text::ScopedNumberLocale stored({".", ","});
+  return text::ParseNumber(plain);
+}
+
 // An hours value of the catalogue: a plain number, or an enciphered one
 // when its text has 16 characters or more.
 // A plain number may be stored as a number or as its text; an enciphered
 // one holds the number written with "." whatever the reader's locale.
-std::string CatalogueHours(const data::Value& v) {
-  if (v.IsNull()) return {};
-  if (v.IsNumber()) return text::FormatNumber(v.ToDouble(), text::kHours);
-  const std::string t = v.ToText();
-  if (t.size() < 16) return text::Format(t, text::kHours);
-  const std::string plain = cipher::DecryptField(t);
-  std::optional<double> n;
-  {
-    text::ScopedNumberLocale stored({".", ","});
-    n = text::ParseNumber(plain);
+void AppendCatalogueHours(std::string& row, const data::Value& v, HoursFormatter& format) {
+  if (v.IsNull()) return;
+  if (v.IsNumber()) {
+    row += format(v.ToDouble());
+    return;
   }
-  return n ? text::FormatNumber(*n, text::kHours) : plain;
+  const std::string* t = v.TextIf();
+  const std::string scratch = t ? std::string() : v.ToText();
+  const std::string& stored = t ? *t : scratch;
+  if (stored.size() < 16) {
+    row += text::Format(stored, text::kHours);
+    return;
+  }
+  const std::string plain = cipher::DecryptField(stored);
+  if (const std::optional<double> n = StoredNumber(plain))
+    row += format(*n);
+  else
+    row += plain;
 }
 
 // The whole-number value of a mask text ("5", " 7"); 0 when it is none.
-int MaskOf(const std::string& s) {
+// The load writes masks as plain digits, read directly; any other text
+// goes through the general number reader.
+int MaskOf(std::string_view s) {
+  if (!s.empty() && s.size() <= 3 && s.find_first_not_of("0123456789") == std::string_view::npos) {
+    int n = 0;
+    std::from_chars(s.data(), s.data() + s.size(), n);
+    return n;
+  }
   auto n = text::ParseNumber(s);
   return n ? static_cast<int>(*n) : 0;
 }
@@ -47,8 +88,11 @@ void GreyByMask(grid::FlexGrid& g, int row, int mask) {
   if (!(mask & 1)) g.CellBackColorAt(row, 4, grid::kGrey);
 }
 
-bool Contains(const std::string& haystackUpper, const std::string& needleUpper) {
-  return haystackUpper.find(needleUpper) != std::string::npos;
+// Without the spaces at either end (as Trim).
+std::string_view Trimmed(std::string_view s) {
+  const size_t first = s.find_first_not_of(' ');
+  if (first == std::string_view::npos) return {};
+  return s.substr(first, s.find_last_not_of(' ') - first + 1);
 }
 
 } // namespace
@@ -59,29 +103,42 @@ void frmLabour::LoadScheduleItems(long scheduleNo, const std::string& firstId,
   forms::FlexGrid& g = FGLabourItems(gridIndex);
   if (g.Rows() > 2) return; // filled already in this session
 
-  data::RecordsetPtr rs;
-  data::Catalogue()->GetLabourItems(rs, scheduleNo, firstId, secondId, bodyId);
-
-  {
-    editor::RedrawSuspended suspended(g);
-    while (!rs->Eof()) {
-      const int mask = rs->Collect("allow_tick").ToInt32();
-      const std::string rr = (mask & 4) ? CatalogueHours(rs->Collect("rrhour")) : std::string();
-      const std::string pt = (mask & 1) ? CatalogueHours(rs->Collect("pthour")) : std::string();
-      g.AddItem(rs->Collect("ItemNo").ToText() + '\t' + text::Trim(rs->Collect("Script").ToText()) +
-                '\t' + rr + "\t\t" + pt + '\t' + std::to_string(mask));
-      const int last = g.Rows() - 1;
-      g.Row(last);
-      GreyByMask(g, last, mask);
-      rs->MoveNext();
-    }
-    if (g.Rows() > 11)
-      g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - editor::kRowStepTwips);
-    if (g.Rows() > 2) g.RemoveItem(1);
-    // The list opens at its first item, where the keyboard starts.
-    if (g.Rows() > 1) g.Row(1);
-  }
-  if (rs->State() == data::adStateOpen) rs->Close();
+  // The items are read one at a time straight into the grid: a schedule of
+  // tens of thousands of items is never held twice.
+  editor::RedrawSuspended suspended(g);
+  enum Field { kMask, kItem, kScript, kRR, kPT }; // the order the catalogue gives
+  HoursFormatter format(text::kHours);
+  std::string row;
+  int last = 0;
+  data::Catalogue()->ForEachLabourItem(
+      scheduleNo, firstId, secondId, bodyId, [&](const std::vector<data::Value>& item) {
+        const int mask = item[kMask].ToInt32();
+        row.clear();
+        if (const std::string* t = item[kItem].TextIf())
+          row += *t;
+        else
+          row += item[kItem].ToText();
+        row += '\t';
+        const data::Value& script = item[kScript];
+        row += script.TextIf() ? Trimmed(*script.TextIf())
+                               : std::string_view(text::Trim(script.ToText()));
+        row += '\t';
+        if (mask & 4) AppendCatalogueHours(row, item[kRR], format);
+        row += "\t\t";
+        if (mask & 1) AppendCatalogueHours(row, item[kPT], format);
+        row += '\t';
+        char digits[16];
+        row.append(digits, std::to_chars(digits, digits + sizeof digits, mask).ptr);
+        g.AddItem(row);
+        last = g.Rows() - 1;
+        GreyByMask(g, last, mask);
+        return true;
+      });
+  if (g.Rows() > 11)
+    g.ColWidth(col::kDescription, g.ColWidth(col::kDescription) - editor::kRowStepTwips);
+  if (g.Rows() > 2) g.RemoveItem(1);
+  // The list opens at its first item, where the keyboard starts.
+  if (g.Rows() > 1) g.Row(1);
 }
 
 void frmLabour::FindCatalogueItemRow(int gridIndex, long& row) {
@@ -209,19 +266,20 @@ void frmLabour::SearchLabourItems() {
   const grid::FlexGrid& cat = FGLabourItems(k);
   {
     editor::RedrawSuspended suspended(fgSearch);
+    int last = 0;
     for (int i = 1; i < cat.Rows(); ++i) {
-      if (!Contains(text::UCase(cat.TextView(i, col::kItemNo)), needle) &&
-          !Contains(text::UCase(cat.TextView(i, col::kDescription)), needle))
+      if (!text::ContainsNoCase(cat.TextView(i, col::kItemNo), needle) &&
+          !text::ContainsNoCase(cat.TextView(i, col::kDescription), needle))
         continue;
-      std::string rowText;
-      for (int c = 0; c <= 5; ++c)
-        rowText += std::string(cat.TextView(i, c)) + '\t';
-      rowText += std::to_string(i);
-      fgSearch.AddItem(rowText);
-      const int last = fgSearch.Rows() - 1;
-      fgSearch.Row(last);
-      GreyByMask(fgSearch, last, MaskOf(fgSearch.TextMatrix(last, 5)));
+      // The item's six cells, then its row in the schedule grid.
+      char number[16];
+      const char* end = std::to_chars(number, number + sizeof number, i).ptr;
+      fgSearch.AddItemFrom(cat, i, 6, std::string_view(number, static_cast<size_t>(end - number)));
+      last = fgSearch.Rows() - 1;
+      GreyByMask(fgSearch, last, MaskOf(cat.TextView(i, 5)));
     }
+    // The last result is current, as adding each one made it.
+    if (last > 0) fgSearch.Row(last);
   }
 
   if (fgSearch.Rows() < 3) {

@@ -368,12 +368,13 @@ void frmLabour::WriteSelectedItems() {
   const std::vector<std::string> removed = editor::RemovedItemIds(mrsDeletedItems.get());
   // Every row the writer will touch is checked first, so a row that cannot
   // be written stops the writer before the record set has changed at all.
-  editor::CheckWriteBack(rs, plan, removed,
-                         {[&g](int row) { return Describe(g, row); }, RefusedValueAdvice,
-                          "frmLabour.WriteSelectedItems"});
-  editor::DropSessionRecords(rs);     // pass 1
-  editor::ApplyRemovals(rs, removed); // pass 2
-  editor::ApplyWriteBack(rs, plan);   // pass 3: one record per present operation
+  const editor::WriteBackTargets targets =
+      editor::CheckWriteBack(rs, plan, removed,
+                             {[&g](int row) { return Describe(g, row); }, RefusedValueAdvice,
+                              "frmLabour.WriteSelectedItems"});
+  editor::DropSessionRecords(rs);             // pass 1
+  editor::ApplyRemovals(rs, removed);         // pass 2
+  editor::ApplyWriteBack(rs, plan, &targets); // pass 3: one record per present operation
 }
 
 } // namespace belvane::labour

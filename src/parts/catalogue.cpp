@@ -18,6 +18,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace belvane::parts {
 
@@ -26,29 +27,8 @@ namespace {
 namespace cat = col::cat;
 namespace sel = col::sel;
 
-// The vehicle parts fields, found once per record set.
-struct VehicleFields {
-  size_t itemNo, partName, script, side, qty, unitcost, partNo, group;
-  explicit VehicleFields(const data::Recordset& rs) {
-    auto index = [&rs](const char* name) {
-      const auto i = rs.Fields().IndexOf(name);
-      if (!i)
-        throw Error(err::kItemNotFound,
-                    std::string("The vehicle parts have no field ") + name +
-                        "; the catalogue must be corrected",
-                    "frmParts.LoadVehicleParts");
-      return *i;
-    };
-    itemNo = index("ItemNo");
-    partName = index("PARTNAME");
-    script = index("Script");
-    side = index("SIDE");
-    qty = index("QTY");
-    unitcost = index("unitcost");
-    partNo = index("partno");
-    group = index("Group");
-  }
-};
+// The vehicle part fields, in the order the catalogue gives them.
+enum VehicleField { kItemNo, kPartName, kScript, kSide, kQty, kUnitcost, kPartNo, kGroup };
 
 // A field's text without a copy where the value is a text already.
 std::string_view TextOf(const data::Value& v, std::string& scratch) {
@@ -73,13 +53,14 @@ void AppendDeciphered(std::string& row, const data::Value& v, std::string& scrat
 // Fills `row` with the row of a vehicle part: the description deciphered,
 // with the side in front of it ("L/H FRONT GUARD") unless the part has no
 // side ("O").
-void VehiclePartRow(data::Recordset& rs, const VehicleFields& f, std::string& row) {
-  auto field = [&rs](size_t i) -> const data::Value& { return rs.Fields(i).Value(); };
+void VehiclePartRow(const std::vector<data::Value>& part, text::NumberTexts& costs,
+                    std::string& row) {
+  auto field = [&part](VehicleField i) -> const data::Value& { return part[i]; };
   std::string scratch;
   row.clear();
-  row += TextOf(field(f.itemNo), scratch);
+  row += TextOf(field(kItemNo), scratch);
   row += '\t';
-  const data::Value& side = field(f.side);
+  const data::Value& side = field(kSide);
   std::string sideText;
   if (!side.IsNull()) {
     sideText = side.ToText();
@@ -89,62 +70,30 @@ void VehiclePartRow(data::Recordset& rs, const VehicleFields& f, std::string& ro
       row += "/H ";
     }
   }
-  const data::Value& partName = field(f.partName);
+  const data::Value& partName = field(kPartName);
   const std::string_view name =
       partName.IsNull() ? std::string_view() : Trimmed(TextOf(partName, scratch));
   if (name.empty())
-    row += Trimmed(TextOf(field(f.script), scratch));
+    row += Trimmed(TextOf(field(kScript), scratch));
   else
     row += cipher::DecryptField(name);
   row += '\t';
   row += sideText;
   row += '\t';
-  row += TextOf(field(f.qty), scratch);
+  row += TextOf(field(kQty), scratch);
   row += '\t';
-  const data::Value& unitcost = field(f.unitcost);
-  row += text::FormatNumber(unitcost.IsNull() ? 0 : unitcost.ToDouble(), text::kHours);
+  const data::Value& unitcost = field(kUnitcost);
+  row += costs(unitcost.IsNull() ? 0 : unitcost.ToDouble());
   row += '\t';
-  AppendDeciphered(row, field(f.partNo), scratch);
+  AppendDeciphered(row, field(kPartNo), scratch);
   row += '\t';
-  AppendDeciphered(row, field(f.group), scratch);
-}
-
-// Whether `haystack` holds `needleUpper` (a text in upper case) without
-// regard to case. An ASCII needle is compared byte by byte: bytes of other
-// characters can never match it, so no upper-case copy of the haystack is
-// needed.
-bool ContainsNoCase(std::string_view haystack, std::string_view needleUpper, bool asciiNeedle) {
-  if (!asciiNeedle) return text::UCase(haystack).find(needleUpper) != std::string::npos;
-  const size_t n = needleUpper.size();
-  if (n == 0) return true;
-  if (haystack.size() < n) return false;
-  auto upper = [](unsigned char c) {
-    return static_cast<unsigned char>(c >= 'a' && c <= 'z' ? c - ('a' - 'A') : c);
-  };
-  const auto first = static_cast<unsigned char>(needleUpper[0]);
-  const size_t lastStart = haystack.size() - n;
-  for (size_t i = 0; i <= lastStart; ++i) {
-    if (upper(static_cast<unsigned char>(haystack[i])) != first) continue;
-    size_t k = 1;
-    while (k < n && upper(static_cast<unsigned char>(haystack[i + k])) ==
-                        static_cast<unsigned char>(needleUpper[k]))
-      ++k;
-    if (k == n) return true;
-  }
-  return false;
-}
-
-bool IsAscii(std::string_view s) {
-  for (char c : s)
-    if (static_cast<unsigned char>(c) >= 0x80) return false;
-  return true;
+  AppendDeciphered(row, field(kGroup), scratch);
 }
 
 } // namespace
 
 void frmParts::LoadVehicleParts(const std::string& make, const std::string& catNo,
                                 const std::string& body) {
-  data::RecordsetPtr rs;
   editor::RedrawSuspended suspended(FGParts);
   try {
     auto catalogue = data::Catalogue();
@@ -154,23 +103,22 @@ void frmParts::LoadVehicleParts(const std::string& make, const std::string& catN
       state = info->Collect("State").ToInt16();
       if (info->State() == data::adStateOpen) info->Close();
     }
-    catalogue->GetVehicleParts(rs, make, catNo, body, state);
-    if (rs && rs->State() == data::adStateOpen) {
-      const VehicleFields fields(*rs);
-      std::string row;
-      for (; !rs->Eof(); rs->MoveNext()) {
-        VehiclePartRow(*rs, fields, row);
-        FGParts.AddItem(row);
-      }
-      rs->Close();
-    }
+    // The parts are read one at a time straight into the grid: a catalogue
+    // of a hundred thousand parts is never held twice.
+    std::string row;
+    text::NumberTexts costs(text::kHours);
+    catalogue->ForEachVehiclePart(make, catNo, body, state,
+                                  [&](const std::vector<data::Value>& part) {
+                                    VehiclePartRow(part, costs, row);
+                                    FGParts.AddItem(row);
+                                    return true;
+                                  });
   } catch (const Error& e) {
     // The rows added so far stay. A catalogue without the table the parts
     // query reads has no vehicle parts: nothing to say.
     if (e.Number() != err::kNoSuchTable)
       forms::MsgBox(std::to_string(e.Number()) + ": " + e.Description(), forms::msgbox::kCritical);
   }
-  rs.reset();
 }
 
 void frmParts::LoadGeneralParts() {
@@ -298,25 +246,21 @@ void frmParts::SearchParts() {
   const std::string wanted = text::Trim(txtSearch.Text());
   if (wanted.empty()) return;
   const std::string needle = text::UCase(wanted);
-  const bool asciiNeedle = IsAscii(needle);
 
   ClearSearchResults();
   {
     editor::RedrawSuspended suspended(fgSearch);
     const grid::FlexGrid& parts = FGParts;
-    std::string row;
     for (int r = 1; r < parts.Rows(); ++r) {
-      if (!ContainsNoCase(parts.TextView(r, cat::kItemNo), needle, asciiNeedle) &&
-          !ContainsNoCase(parts.TextView(r, cat::kDescription), needle, asciiNeedle))
+      if (!text::ContainsNoCase(parts.TextView(r, cat::kItemNo), needle) &&
+          !text::ContainsNoCase(parts.TextView(r, cat::kDescription), needle))
         continue;
-      row.clear();
-      for (int c = cat::kItemNo; c <= cat::kPartNo; ++c) {
-        row += parts.TextView(r, c);
-        row += '\t';
-      }
+      // The part's cells up to its part number, then its row in the
+      // available parts.
       char number[16];
-      row.append(number, std::to_chars(number, number + sizeof number, r).ptr);
-      fgSearch.AddItem(row);
+      const char* end = std::to_chars(number, number + sizeof number, r).ptr;
+      fgSearch.AddItemFrom(parts, r, cat::kPartNo + 1,
+                           std::string_view(number, static_cast<size_t>(end - number)));
     }
   }
   ShowSearchResults();

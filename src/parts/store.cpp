@@ -225,12 +225,13 @@ void frmParts::WriteSelectedParts() {
   const std::vector<std::string> removed = editor::RemovedItemIds(mrsDeletedItems.get());
   // Every row the writer will touch is checked first, so a row that cannot
   // be written stops the writer before the record set has changed at all.
-  editor::CheckWriteBack(rs, plan, removed,
-                         {[&g](int row) { return Describe(g, row); }, RefusedValueAdvice,
-                          "frmParts.WriteSelectedParts"});
-  editor::DropSessionRecords(rs);     // pass 1: what this session appended before
-  editor::ApplyRemovals(rs, removed); // pass 2: the parts the estimator deleted
-  editor::ApplyWriteBack(rs, plan);   // pass 3: one record per part
+  const editor::WriteBackTargets targets =
+      editor::CheckWriteBack(rs, plan, removed,
+                             {[&g](int row) { return Describe(g, row); }, RefusedValueAdvice,
+                              "frmParts.WriteSelectedParts"});
+  editor::DropSessionRecords(rs);             // pass 1: what this session appended before
+  editor::ApplyRemovals(rs, removed);         // pass 2: the parts the estimator deleted
+  editor::ApplyWriteBack(rs, plan, &targets); // pass 3: one record per part
 }
 
 } // namespace belvane::parts

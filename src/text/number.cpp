@@ -6,6 +6,7 @@
 #include <clocale>
 #include <cmath>
 #include <cstdlib>
+#include <cstring>
 #include <langinfo.h>
 #include <locale.h>
 
@@ -90,6 +91,14 @@ ScopedNumberLocale::ScopedNumberLocale(NumberLocale locale) : previous_(tlsOverr
 }
 
 ScopedNumberLocale::~ScopedNumberLocale() { tlsOverride = previous_; }
+
+const std::string& NumberTexts::operator()(double value) {
+  std::uint64_t bits;
+  std::memcpy(&bits, &value, sizeof bits);
+  auto [it, added] = made_.try_emplace(bits);
+  if (added) it->second = FormatNumber(value, pattern_);
+  return it->second;
+}
 
 std::string FormatNumber(double value, std::string_view pattern) {
   if (std::isnan(value)) return "NaN";

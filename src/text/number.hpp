@@ -2,9 +2,11 @@
 // Number texts as the estimator sees them: the three display patterns and the
 // reading of typed numbers under the user's numeric locale.
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
+#include <unordered_map>
 
 namespace belvane::text {
 
@@ -45,6 +47,21 @@ inline constexpr std::string_view kPlain = "###0.00";     // no grouping
 // "2.68" and 1.005 gives "1.01". Negative values keep their sign; a value
 // that rounds to zero shows no sign.
 std::string FormatNumber(double value, std::string_view pattern);
+
+// FormatNumber with one pattern over a pass through many values (a
+// catalogue load), keeping each text it makes: catalogues repeat a few
+// thousand hours and costs over a hundred thousand rows. Texts are made
+// under the locale in force when they are first asked for, so an instance
+// lives no longer than the pass.
+class NumberTexts {
+public:
+  explicit NumberTexts(std::string_view pattern) : pattern_(pattern) {}
+  const std::string& operator()(double value);
+
+private:
+  std::string pattern_;
+  std::unordered_map<std::uint64_t, std::string> made_; // by the value's bits
+};
 
 // Formats a text: a numeric text (see IsNumeric) is read and formatted, any
 // other text is returned unchanged.

@@ -6,6 +6,10 @@
 #include <cstdint>
 #include <cstdio>
 
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
+
 namespace belvane::text {
 
 namespace {
@@ -96,6 +100,12 @@ template <typename F> std::string MapChars(std::string_view s, F f) {
   out.reserve(s.size());
   size_t i = 0;
   while (i < s.size()) {
+    // Plain ASCII, the common case, maps byte by byte.
+    if (static_cast<unsigned char>(s[i]) < 0x80) {
+      out.push_back(static_cast<char>(f(static_cast<unsigned char>(s[i]))));
+      ++i;
+      continue;
+    }
     size_t start = i;
     auto c = DecodeUtf8(s, i);
     if (!c) { // keep bytes of an invalid sequence as they are
@@ -154,6 +164,57 @@ bool EqualsNoCase(std::string_view a, std::string_view b) {
     if (ascii) return true;
   }
   return UCase(a) == UCase(b);
+}
+
+bool ContainsNoCase(std::string_view haystack, std::string_view needleUpper) {
+  const size_t n = needleUpper.size();
+  if (n == 0) return true;
+  for (char c : needleUpper)
+    if (static_cast<unsigned char>(c) >= 0x80)
+      return UCase(haystack).find(needleUpper) != std::string::npos;
+  if (haystack.size() < n) return false;
+  // ASCII letters in upper case; every other byte as it is.
+  static constexpr std::array<unsigned char, 256> kUpper = [] {
+    std::array<unsigned char, 256> t{};
+    for (int c = 0; c < 256; ++c)
+      t[static_cast<size_t>(c)] = static_cast<unsigned char>(c >= 'a' && c <= 'z' ? c - 32 : c);
+    return t;
+  }();
+  const auto* needle = reinterpret_cast<const unsigned char*>(needleUpper.data());
+  const auto* p = reinterpret_cast<const unsigned char*>(haystack.data());
+  const size_t last = n - 1;
+  const size_t starts = haystack.size() - n + 1; // positions a match can start at
+  // A candidate start has the needle's first and last bytes in place. Each
+  // is tested with one comparison: a letter's two cases differ only in bit
+  // 0x20, so that bit is set on both sides; other bytes compare as they are.
+  auto foldOf = [](unsigned char c) -> unsigned char { return c >= 'A' && c <= 'Z' ? 0x20 : 0; };
+  const unsigned char foldFirst = foldOf(needle[0]), first = needle[0] | foldFirst;
+  const unsigned char foldLast = foldOf(needle[last]), lastByte = needle[last] | foldLast;
+  auto matchesAt = [&](size_t i) {
+    for (size_t k = 1; k < last; ++k)
+      if (kUpper[p[i + k]] != needle[k]) return false;
+    return true;
+  };
+  size_t i = 0;
+#if defined(__SSE2__)
+  // Sixteen candidate starts at a time; both loads stay inside the text.
+  const __m128i vFirst = _mm_set1_epi8(static_cast<char>(first));
+  const __m128i vFoldFirst = _mm_set1_epi8(static_cast<char>(foldFirst));
+  const __m128i vLast = _mm_set1_epi8(static_cast<char>(lastByte));
+  const __m128i vFoldLast = _mm_set1_epi8(static_cast<char>(foldLast));
+  for (; i + 16 <= starts; i += 16) {
+    const __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p + i));
+    const __m128i b = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p + i + last));
+    const __m128i both = _mm_and_si128(_mm_cmpeq_epi8(_mm_or_si128(a, vFoldFirst), vFirst),
+                                       _mm_cmpeq_epi8(_mm_or_si128(b, vFoldLast), vLast));
+    for (auto mask = static_cast<unsigned>(_mm_movemask_epi8(both)); mask != 0; mask &= mask - 1)
+      if (matchesAt(i + static_cast<size_t>(__builtin_ctz(mask)))) return true;
+  }
+#endif
+  for (; i < starts; ++i)
+    if ((p[i] | foldFirst) == first && (p[i + last] | foldLast) == lastByte && matchesAt(i))
+      return true;
+  return false;
 }
 
 std::string Cp1252ToUtf8(std::string_view bytes) {

@@ -23,6 +23,12 @@ std::string LCase(std::string_view utf8);
 // Case-insensitive equality under the rules of UCase.
 bool EqualsNoCase(std::string_view a, std::string_view b);
 
+// Whether `haystack` holds `needleUpper`, a text already in upper case (as
+// UCase gives it), without regard to case under the rules of UCase. An
+// ASCII needle is matched in place, without an upper-case copy of the
+// haystack: bytes of other characters can never match it.
+bool ContainsNoCase(std::string_view haystack, std::string_view needleUpper);
+
 // True when the text is well-formed UTF-8: no overlong forms, no
 // surrogates, nothing past U+10FFFF, no cut-off sequence.
 bool IsValidUtf8(std::string_view text);

@@ -291,3 +291,81 @@ TEST_P(CatalogueContract, AMissingCatalogueCannotBeOpened) {
   EXPECT_EQ(ErrorNumber([&] { GetParam().openMissing(); }, &description), err::kDataService);
   EXPECT_FALSE(description.empty());
 }
+
+namespace belvane::test {
+namespace {
+
+// Rows streamed must be the rows of the record set, in order, for every
+// case the record set tests above cover (fallback, empty, unknown vehicle),
+// each value reading as the record set's does; a sink that stops early
+// gets no more rows; a bad schedule raises the same error.
+TEST_P(CatalogueContract, StreamedRowsAreTheRecordSetsRows) {
+  using data::Value;
+  // Texts as a loader reads them: every value through ToText, so a number
+  // held in the record set's field type and the stored one agree.
+  auto recordRows = [](data::Recordset& rs) {
+    std::vector<std::vector<std::string>> rows;
+    for (rs.MoveFirst(); !rs.Eof(); rs.MoveNext()) {
+      std::vector<std::string> row;
+      for (size_t i = 0; i < rs.Fields().Count(); ++i)
+        row.push_back(rs.Fields(i).Value().ToText());
+      rows.push_back(row);
+    }
+    return rows;
+  };
+  std::vector<std::vector<std::string>> streamed;
+  auto collect = [&streamed](const std::vector<Value>& row) {
+    std::vector<std::string> texts;
+    for (const Value& v : row)
+      texts.push_back(v.ToText());
+    streamed.push_back(texts);
+    return true;
+  };
+  struct Labour {
+    long schedule;
+    const char *first, *second, *body;
+  };
+  for (const Labour& l :
+       {Labour{data::kScheduleNrma, " N1 ", "M1", "12"},
+        Labour{data::kScheduleMta, "M1", "N1", "11"}, Labour{data::kScheduleMta, "", "N1", "11"},
+        Labour{data::kScheduleThird, "T1", "", "11"}}) {
+    data::RecordsetPtr rs;
+    cat_->GetLabourItems(rs, l.schedule, l.first, l.second, l.body);
+    streamed.clear();
+    cat_->ForEachLabourItem(l.schedule, l.first, l.second, l.body, collect);
+    EXPECT_EQ(streamed, recordRows(*rs)) << l.schedule << " " << l.first;
+  }
+  struct Vehicle {
+    const char *make, *catNo, *body;
+    int16_t state;
+  };
+  for (const Vehicle& v :
+       {Vehicle{" kestrel ", "KS100", "11", 2}, Vehicle{"KESTREL", "KS100", "12", 3},
+        Vehicle{"KESTREL", "", "11", 2}, Vehicle{"NOPE", "KS100", "11", 2}}) {
+    data::RecordsetPtr rs;
+    cat_->GetVehicleParts(rs, v.make, v.catNo, v.body, v.state);
+    streamed.clear();
+    cat_->ForEachVehiclePart(v.make, v.catNo, v.body, v.state, collect);
+    EXPECT_EQ(streamed, recordRows(*rs)) << v.make << " " << v.catNo;
+  }
+  // Enciphered values arrive as stored and decipher.
+  streamed.clear();
+  cat_->ForEachVehiclePart("KESTREL", "KS100", "11", 2, collect);
+  ASSERT_FALSE(streamed.empty());
+  EXPECT_EQ(cipher::DecryptField(streamed[0][1]), "FRONT BUMPER BAR COVER");
+
+  int seen = 0;
+  cat_->ForEachVehiclePart("KESTREL", "KS100", "11", 2, [&seen](const std::vector<Value>&) {
+    ++seen;
+    return false;
+  });
+  EXPECT_EQ(seen, 1);
+  EXPECT_EQ(ErrorNumber([&] {
+              cat_->ForEachLabourItem(4, "N1", "", "11",
+                                      [](const std::vector<Value>&) { return true; });
+            }),
+            err::kInvalidCall);
+}
+
+} // namespace
+} // namespace belvane::test

@@ -4,6 +4,10 @@
 
 #include <gtest/gtest.h>
 
+#include <cctype>
+#include <string>
+#include <vector>
+
 using namespace belvane;
 using namespace belvane::data;
 
@@ -268,4 +272,75 @@ TEST(Recordset, FindScalesOverLargeRecordSets) {
   EXPECT_TRUE(rs.Eof()); // 21 * 2: i = 21 was deleted
   rs.Find("ITEMID = 3", 0, adSearchForward, adBookmarkFirst);
   EXPECT_TRUE(rs.Eof());
+}
+
+// Names are found through a hash of their length and a few bytes: names
+// alike in those must still be told apart, in any case, and a name that
+// is not there found as missing.
+TEST(Recordset, FieldNamesAlikeInHashAreToldApart) {
+  Recordset rs;
+  std::vector<std::string> names;
+  for (char a = 'A'; a <= 'Z'; ++a)
+    names.push_back(std::string("F") + a + "X"); // same length, first and last byte
+  for (int i = 0; i < 20; ++i)
+    names.push_back("field_" + std::to_string(i)); // same first byte and length
+  names.push_back("Größe");                        // not ASCII: the full case mapping
+  for (const std::string& n : names)
+    rs.Fields().Append(n, DataType::Variant);
+  ASSERT_EQ(rs.Fields().Count(), names.size());
+  for (size_t i = 0; i < names.size(); ++i) {
+    std::string lower = names[i];
+    for (char& c : lower)
+      c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+    EXPECT_EQ(rs.Fields().IndexOf(names[i]), i) << names[i];
+    EXPECT_EQ(rs.Fields().IndexOf(lower), i) << lower;
+  }
+  EXPECT_EQ(rs.Fields().IndexOf("GRÖSSE"), std::nullopt);
+  EXPECT_EQ(rs.Fields().IndexOf("GRÖßE"), names.size() - 1);
+  EXPECT_EQ(rs.Fields().IndexOf("F1X"), std::nullopt);
+  EXPECT_EQ(rs.Fields().IndexOf("field_20"), std::nullopt);
+  EXPECT_EQ(rs.Fields().IndexOf(""), std::nullopt);
+  EXPECT_EQ(ErrorNumber([&] { rs.Fields().Append("fax", DataType::Variant); }), err::kBadArguments);
+}
+
+TEST(Recordset, LoadedValuesOfAnotherTypeAreStillConverted) {
+  Recordset rs;
+  rs.Fields().Append("n", DataType::SmallInt);
+  rs.Fields().Append("t", DataType::VarWChar);
+  rs.Fields().Append("d", DataType::Double);
+  rs.Open();
+  rs.AppendLoaded({Value(int32_t{7}), Value(2.5), Value("3")});
+  rs.MoveFirst();
+  EXPECT_EQ(rs.Collect("n").Type(), ValueType::Integer);
+  EXPECT_EQ(rs.Collect("t").Type(), ValueType::Text);
+  EXPECT_EQ(rs.Collect("d"), Value(3.0));
+  // A write of the same value in the field's own type changes nothing.
+  rs.Collect("t", Value(rs.Collect("t").ToText()));
+  EXPECT_EQ(rs.Status(), RecordStatus::Unchanged);
+  rs.Collect("t", Value("other"));
+  EXPECT_EQ(rs.Status(), RecordStatus::Modified);
+  EXPECT_EQ(rs.Fields("t").OriginalValue().Type(), ValueType::Text);
+}
+
+TEST(Recordset, BackToAStoredRecordOnlyWhileItIsLiveAndInView) {
+  auto rs = QuoteItems();
+  rs->Find("ITEMID = 12", 0, adSearchForward, adBookmarkFirst);
+  const size_t twelve = rs->CurrentStored();
+  rs->MoveFirst();
+  EXPECT_TRUE(rs->MoveToStored(twelve));
+  EXPECT_EQ(rs->Collect("ITEMID").ToInt32(), 12);
+  // Outside the filter, or deleted, it cannot be made current.
+  rs->SetFilter("ITEMID <> 12");
+  rs->MoveFirst();
+  EXPECT_FALSE(rs->MoveToStored(twelve));
+  EXPECT_EQ(rs->Collect("ITEMID").ToInt32(), 10); // the cursor did not move
+  rs->SetFilter("");
+  ASSERT_TRUE(rs->MoveToStored(twelve));
+  rs->Delete();
+  rs->MoveFirst();
+  EXPECT_FALSE(rs->MoveToStored(twelve));
+  EXPECT_FALSE(rs->MoveToStored(99));
+  rs->MoveLast();
+  rs->MoveNext();
+  EXPECT_EQ(ErrorNumber([&] { (void)rs->CurrentStored(); }), err::kNoCurrentRecord);
 }

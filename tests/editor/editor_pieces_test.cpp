@@ -163,3 +163,58 @@ TEST(EditorPieces, AWriteBackThatCannotBeDoneChangesNothing) {
 
 } // namespace
 } // namespace belvane::test
+
+namespace belvane::test {
+namespace {
+
+// The write-back returns to the records its check found; a record deleted
+// between the check and the write (here by an earlier deletion in the same
+// plan) is searched for again, as it was before targets existed.
+TEST(EditorPieces, TheWriteBackGoesToTheRecordsItsCheckFound) {
+  auto rs = Items();
+  rs->AcceptChanges();
+  const editor::WriteBackWords words{[](int row) { return "Row " + std::to_string(row); },
+                                     [](const editor::FieldWrite&) { return std::string(); },
+                                     "test"};
+  using editor::PlannedRecord;
+  std::vector<PlannedRecord> plan;
+  plan.push_back(
+      {PlannedRecord::Kind::Write, 1, "5", "Id", "part", {{"qty", data::Value(4.0), 4}}});
+  plan.push_back({PlannedRecord::Kind::Delete, 2, "1", "Id", "part", {}});
+  plan.push_back(
+      {PlannedRecord::Kind::Write, 3, "1", "Id", "part", {{"qty", data::Value(9.0), 4}}});
+  plan.push_back({PlannedRecord::Kind::Write, 4, "", "Id", "part", {{"qty", data::Value(2.0), 4}}});
+  const editor::WriteBackTargets targets = editor::CheckWriteBack(*rs, plan, {}, words);
+  ASSERT_EQ(targets.size(), plan.size());
+  EXPECT_TRUE(targets[0] && targets[2]);
+  EXPECT_FALSE(targets[1] || targets[3]); // a deletion and a new record have none
+  // The same write-back with and without targets gives the same records.
+  auto plain = Items();
+  plain->AcceptChanges();
+  editor::CheckWriteBack(*plain, plan, {}, words);
+  // Record 1 is deleted by the plan's second entry, so its later write
+  // fails alike both ways, after the same writes.
+  EXPECT_EQ(ErrorNumber([&] { editor::ApplyWriteBack(*rs, plan, &targets); }),
+            err::kNoCurrentRecord);
+  EXPECT_EQ(ErrorNumber([&] { editor::ApplyWriteBack(*plain, plan); }), err::kNoCurrentRecord);
+  ASSERT_EQ(rs->StoredCount(), plain->StoredCount());
+  for (size_t r = 0; r < rs->StoredCount(); ++r) {
+    EXPECT_EQ(rs->StoredStatus(r), plain->StoredStatus(r)) << r;
+    EXPECT_EQ(rs->StoredValue(r, 3), plain->StoredValue(r, 3)) << r;
+  }
+  editor::FindItemId(*rs, "5");
+  EXPECT_EQ(rs->Collect("qty").ToDouble(), 4.0);
+
+  // Without the deletion the writes land where the check found them.
+  plan.erase(plan.begin() + 1);
+  auto again = Items();
+  again->AcceptChanges();
+  const editor::WriteBackTargets found = editor::CheckWriteBack(*again, plan, {}, words);
+  editor::ApplyWriteBack(*again, plan, &found);
+  editor::FindItemId(*again, "1");
+  EXPECT_EQ(again->Collect("qty").ToDouble(), 9.0);
+  EXPECT_EQ(again->RecordCount(), 6);
+}
+
+} // namespace
+} // namespace belvane::test

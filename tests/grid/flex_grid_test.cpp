@@ -135,6 +135,64 @@ TEST(FlexGridRows, AddItemSplitsOnTabsIntoColumns) {
   EXPECT_EQ(RowTexts(g, 5), (std::vector<std::string>{"", "", "", "last"}));
 }
 
+// A row copied from another grid must be exactly the row AddItem makes of
+// the same texts joined by tabs, whatever the two grids' shapes.
+TEST(FlexGridRows, AddItemFromMakesTheRowAddItemMakesOfTheSameTexts) {
+  FlexGrid source;
+  source.Cols(5);
+  source.TextMatrix(0, 1, "Title");
+  source.AddItem("101\tFront bumper\t1.50\t\tgroup");
+  source.AddItem("");                  // every cell empty
+  source.AddItem("\t\t\t\tonly last"); // empty cells before a text
+  for (int destCols : {1, 3, 4, 5, 7}) {
+    for (int row = 0; row < source.Rows(); ++row) {
+      for (int count : {0, 1, 3, 5}) {
+        for (const std::string next : {"", "42"}) {
+          FlexGrid copied, added;
+          copied.Cols(destCols);
+          added.Cols(destCols);
+          copied.AddItemFrom(source, row, count, next);
+          std::string joined;
+          for (int c = 0; c < count; ++c)
+            joined += source.TextMatrix(row, c) + '\t';
+          added.AddItem(joined + next);
+          const int last = copied.Rows() - 1;
+          ASSERT_EQ(RowTexts(copied, last), RowTexts(added, last))
+              << destCols << " columns, row " << row << ", " << count << " cells, next " << next;
+          // The copy is a row of its own: changing it leaves the source alone.
+          copied.TextMatrix(last, 0, "changed");
+          ASSERT_EQ(source.TextMatrix(row, 0),
+                    row == 2 ? "101" : ""); // row 1: a new grid's blank row
+        }
+      }
+    }
+  }
+}
+
+TEST(FlexGridRows, AddItemFromItsOwnRowsAndOutOfRange) {
+  FlexGrid g;
+  g.Cols(3);
+  g.AddItem("a\tb\tc");
+  int inserted = 0;
+  struct Listener : ModelObserver {
+    int* count;
+    explicit Listener(int* c) : count(c) {}
+    void RowsInserted(int, int n) override { *count += n; }
+  } listener(&inserted);
+  g.AddObserver(&listener);
+  // From this very grid, with the next text a view of the row copied.
+  for (int i = 0; i < 40; ++i)
+    g.AddItemFrom(g, 2, 2, g.TextView(2, 2));
+  EXPECT_EQ(inserted, 40);
+  EXPECT_EQ(RowTexts(g, g.Rows() - 1), (std::vector<std::string>{"a", "b", "c"}));
+  const int rows = g.Rows();
+  EXPECT_EQ(ErrorNumber([&] { g.AddItemFrom(g, rows, 1, ""); }), belvane::err::kInvalidRowValue);
+  EXPECT_EQ(ErrorNumber([&] { g.AddItemFrom(g, 1, 4, ""); }), belvane::err::kInvalidColValue);
+  EXPECT_EQ(ErrorNumber([&] { g.AddItemFrom(g, 1, -1, ""); }), belvane::err::kInvalidColValue);
+  EXPECT_EQ(g.Rows(), rows);
+  g.RemoveObserver(&listener);
+}
+
 TEST(FlexGridRows, CellTextsOfARowStayApartWhenOneChanges) {
   FlexGrid g;
   g.Cols(3);

@@ -3,6 +3,9 @@
 
 #include <gtest/gtest.h>
 
+#include <cctype>
+#include <string>
+
 using namespace belvane::text;
 
 TEST(Trim, DropsSpacesOnly) {
@@ -54,4 +57,51 @@ TEST(Cp1252, RefusesWhatItCannotHold) {
     EXPECT_NE(e.Description().find("U+6F22"), std::string::npos);
     EXPECT_NE(e.Description().find("offset 3"), std::string::npos);
   }
+}
+
+// The search scans sixteen start positions at a time, then the rest one by
+// one: every length and match position across those boundaries must agree
+// with a plain upper-case search.
+TEST(ContainsNoCase, AgreesWithAnUpperCaseSearchAtEveryLengthAndPosition) {
+  const std::string needles[] = {"B", "BU", "BUMPER", "41", "L/H", "TAILGATE 41", "-7"};
+  for (const std::string& needle : needles) {
+    for (size_t length = 0; length <= 40; ++length) {
+      for (size_t at = 0; at + needle.size() <= length; ++at) {
+        // Filler that shares letters with the needles, the needle in mixed
+        // case at `at`.
+        std::string hay(length, 'a');
+        for (size_t i = 0; i < length; ++i)
+          hay[i] = "bumpertailgte"[i % 13];
+        for (size_t k = 0; k < needle.size(); ++k)
+          hay[at + k] = static_cast<char>(k % 2 ? std::tolower(needle[k]) : needle[k]);
+        const bool expected = UCase(hay).find(needle) != std::string::npos;
+        ASSERT_EQ(ContainsNoCase(hay, needle), expected) << needle << " in " << hay;
+        ASSERT_TRUE(expected);
+      }
+      // No match anywhere: the needle's first and last bytes alone, and a
+      // near miss in the last position.
+      std::string miss(length, 'x');
+      if (length >= needle.size() && needle.size() > 1) {
+        miss.replace(length - needle.size(), needle.size(), needle);
+        miss[length - 1] = '#';
+      }
+      ASSERT_EQ(ContainsNoCase(miss, needle), UCase(miss).find(needle) != std::string::npos)
+          << needle << " in " << miss;
+    }
+  }
+}
+
+TEST(ContainsNoCase, BytesOfOtherCharactersNeverMatchAnAsciiNeedle) {
+  // 0xC1 | 0x20 is 0xE1 and "Á" folds to nothing ASCII: only real letters
+  // match, whatever bit 0x20 does to other bytes.
+  EXPECT_FALSE(ContainsNoCase("\xC3\x81\xC3\xA1", "A"));
+  EXPECT_FALSE(ContainsNoCase("@@@@@@@@@@@@@@@@@@@@", "`"));
+  EXPECT_FALSE(ContainsNoCase("[[[[[[[[[[[[[[[[[[[[", "{"));
+  EXPECT_TRUE(ContainsNoCase("caf\xC3\xA9 bar", "BAR"));
+  EXPECT_TRUE(ContainsNoCase("anything", ""));
+  EXPECT_FALSE(ContainsNoCase("", "A"));
+  EXPECT_FALSE(ContainsNoCase("BUMPE", "BUMPER"));
+  // A needle with other characters takes the full case mapping.
+  EXPECT_TRUE(ContainsNoCase("front caf\xC3\xA9 panel", UCase("CAF\xC3\xA9")));
+  EXPECT_FALSE(ContainsNoCase("front cafe panel", UCase("CAF\xC3\xA9")));
 }

@@ -122,6 +122,7 @@ RecordsetPtr ReadRecordset(Statement& st) {
     rs->Fields().Append(unique, type, type == DataType::VarWChar ? v.longestText : 0);
   }
   rs->Open();
+  rs->ReserveRecords(rows.size());
   for (auto& row : rows)
     rs->AppendLoaded(std::move(row));
   rs->MoveFirst();
@@ -210,13 +211,63 @@ std::unique_ptr<sqlite::Statement> SqliteCatalogue::PrepareQuery(const std::stri
   return holder;
 }
 
-void SqliteCatalogue::GetLabourItems(RecordsetPtr& rs, long schedule, const std::string& firstId,
-                                     const std::string& secondId, const std::string& bodyId) {
+namespace {
+
+void CheckSchedule(long schedule) {
   if (schedule < kScheduleNrma || schedule > kScheduleCp)
     throw Error(err::kInvalidCall,
                 "Invalid procedure call or argument: labour schedule " + std::to_string(schedule) +
                     " (0 to 3)",
                 sqlite::kSource);
+}
+
+// Steps a bound statement, handing each row's values to `row`. Returns the
+// rows handed over.
+long StepRows(sqlite::Statement& st, const CatalogueDataObject::RowSink& row) {
+  const int columns = st.ColumnCount();
+  std::vector<Value> values(static_cast<size_t>(columns));
+  long rows = 0;
+  while (st.Step()) {
+    for (int c = 0; c < columns; ++c)
+      values[static_cast<size_t>(c)] = st.Column(c);
+    ++rows;
+    if (!row(values)) break;
+  }
+  return rows;
+}
+
+} // namespace
+
+void SqliteCatalogue::ForEachLabourItem(long schedule, const std::string& firstId,
+                                        const std::string& secondId, const std::string& bodyId,
+                                        const RowSink& row) {
+  CheckSchedule(schedule);
+  const std::string first = text::Trim(firstId), second = text::Trim(secondId),
+                    body = text::Trim(bodyId);
+  auto items = [&](const std::string& id) {
+    sqlite::Statement st(*db_, kLabourItemsSql);
+    st.BindInt(1, schedule);
+    BindKey(st, 2, id);
+    st.BindText(3, body);
+    return StepRows(st, row);
+  };
+  if (items(first) == 0 && !second.empty()) items(second);
+}
+
+void SqliteCatalogue::ForEachVehiclePart(const std::string& make, const std::string& catNo,
+                                         const std::string& bodyId, int16_t state,
+                                         const RowSink& row) {
+  sqlite::Statement st(*db_, kVehiclePartsSql);
+  BindKey(st, 1, text::Trim(catNo));
+  st.BindText(2, text::Trim(make));
+  st.BindText(3, text::Trim(bodyId));
+  st.BindInt(4, state);
+  StepRows(st, row);
+}
+
+void SqliteCatalogue::GetLabourItems(RecordsetPtr& rs, long schedule, const std::string& firstId,
+                                     const std::string& secondId, const std::string& bodyId) {
+  CheckSchedule(schedule);
   const std::string first = text::Trim(firstId), second = text::Trim(secondId),
                     body = text::Trim(bodyId);
   auto items = [&](const std::string& id) {

@@ -43,6 +43,11 @@ public:
   void GetVehicleParts(RecordsetPtr& rs, const std::string& make, const std::string& catNo,
                        const std::string& bodyId, int16_t state) override;
   bool HasVehicleDiagram(const std::string& make) override;
+  // Stepped straight from the queries, no record set held.
+  void ForEachLabourItem(long schedule, const std::string& firstId, const std::string& secondId,
+                         const std::string& bodyId, const RowSink& row) override;
+  void ForEachVehiclePart(const std::string& make, const std::string& catNo,
+                          const std::string& bodyId, int16_t state, const RowSink& row) override;
 
   // Runs one read-only query as OpenRecordset does, but hands the rows over
   // one at a time as they are read instead of holding them all: first the
