@@ -444,7 +444,9 @@ int main(int argc, char** argv) {
   benchmark::RegisterBenchmark("BM_CatalogueOpen", BM_CatalogueOpen)->Apply(ms);
   benchmark::RegisterBenchmark("BM_CatalogueReadDecipherBaseline", BM_CatalogueReadDecipherBaseline)
       ->Apply(ms);
-  benchmark::RegisterBenchmark("BM_Search", BM_Search)->DenseRange(0, 1)->Apply(ms);
+  // Each search opens the whole catalogue first (untimed): a fixed count of
+  // searches keeps the run short.
+  benchmark::RegisterBenchmark("BM_Search", BM_Search)->DenseRange(0, 1)->Iterations(40)->Apply(ms);
   benchmark::RegisterBenchmark("BM_SearchScanBaseline", BM_SearchScanBaseline)
       ->DenseRange(0, 1)
       ->Apply(ms);
