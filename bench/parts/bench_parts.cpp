@@ -224,7 +224,7 @@ void BM_CatalogueOpen(benchmark::State& state) {
 
 // Baseline: the same vehicle's parts read with SQLite alone, every column
 // taken as a string or a number, the enciphered ones (name, part number,
-// group) deciphered; no record set, no grid.
+// group) deciphered together; no record set, no grid.
 void BM_CatalogueReadDecipherBaseline(benchmark::State& state) {
   sqlite3* db = nullptr;
   sqlite3_open_v2(UseCatalogue().Path().c_str(), &db, SQLITE_OPEN_READONLY, nullptr);
@@ -243,17 +243,28 @@ void BM_CatalogueReadDecipherBaseline(benchmark::State& state) {
     sqlite3_bind_text(st, 3, "", -1, SQLITE_STATIC);
     sqlite3_bind_int(st, 4, 1);
     rows = 0;
+    std::array<std::string_view, 3> enciphered;
+    std::array<std::string, 3> clear;
     while (sqlite3_step(st) == SQLITE_ROW) {
+      enciphered = {};
       for (int c = 0; c < 8; ++c) {
         if (sqlite3_column_type(st, c) == SQLITE_TEXT) {
-          std::string text(reinterpret_cast<const char*>(sqlite3_column_text(st, c)),
-                           static_cast<size_t>(sqlite3_column_bytes(st, c)));
-          if (c == 1 || c == 6 || c == 7) text = cipher::DecryptField(text);
+          const std::string_view view(reinterpret_cast<const char*>(sqlite3_column_text(st, c)),
+                                      static_cast<size_t>(sqlite3_column_bytes(st, c)));
+          if (c == 1 || c == 6 || c == 7) {
+            enciphered[c == 1 ? 0 : c - 5] = view;
+            continue;
+          }
+          std::string text(view);
           benchmark::DoNotOptimize(text);
         } else {
           benchmark::DoNotOptimize(sqlite3_column_double(st, c));
         }
       }
+      // The enciphered fields of a row are deciphered together, the
+      // quickest way there is.
+      cipher::DecryptFields(enciphered, clear);
+      benchmark::DoNotOptimize(clear);
       ++rows;
     }
     sqlite3_finalize(st);

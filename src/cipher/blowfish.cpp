@@ -107,16 +107,37 @@ template <bool Encrypt> void ProcessBytes(std::span<std::uint8_t> data) {
       store(p + 8 * k + 4, r[k]);
     }
   }
-  for (; blocks > 0; --blocks, p += kBlowfishBlockBytes) {
-    std::uint32_t l = load(p);
-    std::uint32_t r = load(p + 4);
-    if constexpr (Encrypt) {
-      Encipher<1>(st, &l, &r);
-    } else {
-      Decipher<1>(st, &l, &r);
+  // The last one to three blocks, side by side as well: short data (a field
+  // of a block or two, a few fields at once) is mostly this tail.
+  auto tail = [&]<std::size_t N>() {
+    std::uint32_t l[N];
+    std::uint32_t r[N];
+    for (std::size_t k = 0; k < N; ++k) {
+      l[k] = load(p + 8 * k);
+      r[k] = load(p + 8 * k + 4);
     }
-    store(p, l);
-    store(p + 4, r);
+    if constexpr (Encrypt) {
+      Encipher<N>(st, l, r);
+    } else {
+      Decipher<N>(st, l, r);
+    }
+    for (std::size_t k = 0; k < N; ++k) {
+      store(p + 8 * k, l[k]);
+      store(p + 8 * k + 4, r[k]);
+    }
+  };
+  switch (blocks) {
+  case 3:
+    tail.template operator()<3>();
+    break;
+  case 2:
+    tail.template operator()<2>();
+    break;
+  case 1:
+    tail.template operator()<1>();
+    break;
+  default:
+    break;
   }
 }
 

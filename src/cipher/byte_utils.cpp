@@ -65,6 +65,20 @@ std::size_t HexToBytes(std::string_view hex, std::span<std::uint8_t> bytes) {
   return count;
 }
 
+bool TryHexToBytes(std::string_view hex, std::uint8_t* out) {
+  // A bad digit looks up as -1 and sets the sign bit of `bad`, so one test at
+  // the end covers them all.
+  const std::size_t count = hex.size() / 2;
+  int bad = 0;
+  for (std::size_t i = 0; i < count; ++i) {
+    const int hi = kDigitValue[static_cast<unsigned char>(hex[2 * i])];
+    const int lo = kDigitValue[static_cast<unsigned char>(hex[2 * i + 1])];
+    bad |= hi | lo;
+    out[i] = static_cast<std::uint8_t>((hi & 0xF) << 4 | (lo & 0xF));
+  }
+  return bad >= 0;
+}
+
 std::string StringToHex(std::string_view bytes) {
   static constexpr char kDigits[] = "0123456789ABCDEF";
   std::string out(bytes.size() * 2, '0');

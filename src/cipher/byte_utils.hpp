@@ -23,4 +23,9 @@ std::string StringToHex(std::string_view bytes);
 // The byte string of hex.size() / 2 bytes that `hex` spells.
 std::string HexToString(std::string_view hex);
 
+// Writes the hex.size() / 2 bytes that `hex` spells to `out`, which has room
+// for them. Returns false, the bytes unspecified, when a digit pair is not
+// hexadecimal (where HexToBytes would raise error 13).
+bool TryHexToBytes(std::string_view hex, std::uint8_t* out);
+
 } // namespace belvane::cipher

@@ -44,19 +44,31 @@ std::string_view Trimmed(std::string_view s) {
   return s.substr(first, s.find_last_not_of(' ') - first + 1);
 }
 
-// Appends an enciphered value in clear; a blank one is empty.
-void AppendDeciphered(std::string& row, const data::Value& v, std::string& scratch) {
-  const std::string_view stored = Trimmed(TextOf(v, scratch));
-  if (!stored.empty()) row += cipher::DecryptField(stored);
-}
+// The texts of a vehicle part row that are kept enciphered: the part name,
+// the part number and the group, deciphered together (side by side, about
+// twice as quick as one at a time). A blank one is empty.
+struct PartClearTexts {
+  std::array<std::string, 3> values;
+  std::array<std::string, 3> scratch;
+  bool nameBlank = false;
+
+  void Decipher(const data::Value& name, const data::Value& partNo, const data::Value& group) {
+    const std::array<std::string_view, 3> stored = {
+        name.IsNull() ? std::string_view() : Trimmed(TextOf(name, scratch[0])),
+        Trimmed(TextOf(partNo, scratch[1])), Trimmed(TextOf(group, scratch[2]))};
+    nameBlank = stored[0].empty();
+    cipher::DecryptFields(stored, values);
+  }
+};
 
 // Fills `row` with the row of a vehicle part: the description deciphered,
 // with the side in front of it ("L/H FRONT GUARD") unless the part has no
 // side ("O").
 void VehiclePartRow(const std::vector<data::Value>& part, text::NumberTexts& costs,
-                    std::string& row) {
+                    PartClearTexts& clear, std::string& row) {
   auto field = [&part](VehicleField i) -> const data::Value& { return part[i]; };
   std::string scratch;
+  clear.Decipher(field(kPartName), field(kPartNo), field(kGroup));
   row.clear();
   row += TextOf(field(kItemNo), scratch);
   row += '\t';
@@ -70,13 +82,11 @@ void VehiclePartRow(const std::vector<data::Value>& part, text::NumberTexts& cos
       row += "/H ";
     }
   }
-  const data::Value& partName = field(kPartName);
-  const std::string_view name =
-      partName.IsNull() ? std::string_view() : Trimmed(TextOf(partName, scratch));
-  if (name.empty())
+  // A part without a name is described by its script.
+  if (clear.nameBlank)
     row += Trimmed(TextOf(field(kScript), scratch));
   else
-    row += cipher::DecryptField(name);
+    row += clear.values[0];
   row += '\t';
   row += sideText;
   row += '\t';
@@ -85,9 +95,9 @@ void VehiclePartRow(const std::vector<data::Value>& part, text::NumberTexts& cos
   const data::Value& unitcost = field(kUnitcost);
   row += costs(unitcost.IsNull() ? 0 : unitcost.ToDouble());
   row += '\t';
-  AppendDeciphered(row, field(kPartNo), scratch);
+  row += clear.values[1];
   row += '\t';
-  AppendDeciphered(row, field(kGroup), scratch);
+  row += clear.values[2];
 }
 
 } // namespace
@@ -107,9 +117,10 @@ void frmParts::LoadVehicleParts(const std::string& make, const std::string& catN
     // of a hundred thousand parts is never held twice.
     std::string row;
     text::NumberTexts costs(text::kHours);
+    PartClearTexts clear;
     catalogue->ForEachVehiclePart(make, catNo, body, state,
                                   [&](const std::vector<data::Value>& part) {
-                                    VehiclePartRow(part, costs, row);
+                                    VehiclePartRow(part, costs, clear, row);
                                     FGParts.AddItem(row);
                                     return true;
                                   });

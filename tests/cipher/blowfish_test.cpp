@@ -120,7 +120,7 @@ TEST(BlowfishVectors, SetKeyLengths1To24) {
 
 TEST(BlowfishVectors, BulkOperationsMatchTheBlockOperation) {
   ASSERT_TRUE(BlowfishInitKey(Hex(kSetKeyKey), 24));
-  // 0 to 11 blocks: the interleaved path, the single-block tail, and both.
+  // 0 to 11 blocks: four side by side, the tails of one to three, and both.
   for (std::size_t blocks = 0; blocks <= 11; ++blocks) {
     std::vector<std::uint32_t> plain(blocks * 2);
     std::vector<std::uint8_t> bytes;

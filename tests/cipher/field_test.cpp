@@ -8,12 +8,14 @@
 
 #include <gtest/gtest.h>
 
+#include <array>
 #include <cstdint>
 #include <filesystem>
 #include <fstream>
 #include <functional>
 #include <random>
 #include <string>
+#include <string_view>
 #include <thread>
 #include <unistd.h>
 #include <vector>
@@ -139,6 +141,51 @@ TEST_F(FieldTest, RoundTrips) {
     EXPECT_EQ(DecryptField(lower), v);
     EXPECT_EQ(DecryptField(enc + "F"), v); // odd last digit ignored
   }
+}
+
+TEST_F(FieldTest, ManyFieldsAtOnceReadAsEachAlone) {
+  // Texts of every shape side by side: empty, one block, several blocks,
+  // lower case, an odd last digit, Windows-1252 characters, padding counts
+  // 1 to 8, and enough of them to pass both the stack's room for eight
+  // texts and for 256 bytes.
+  std::vector<std::string> texts = {"", EncryptField("12.50"), EncryptField("L/H Guard £5 – €"),
+                                    EncryptField("ABCDEFGH") + "F"};
+  for (std::size_t n = 0; n <= 40; n += 3)
+    texts.push_back(EncryptField(std::string(n, static_cast<char>('a' + n % 26))));
+  std::string lower = EncryptField("Pare-chocs arrière");
+  for (char& c : lower)
+    c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+  texts.push_back(lower);
+  texts.push_back("");
+  for (std::size_t count : {std::size_t{1}, std::size_t{3}, std::size_t{8}, texts.size()}) {
+    std::vector<std::string_view> views(texts.begin(), texts.begin() + static_cast<long>(count));
+    std::vector<std::string> values(count, "left over");
+    DecryptFields(views, values);
+    for (std::size_t i = 0; i < count; ++i)
+      EXPECT_EQ(values[i], DecryptField(texts[i])) << count << " texts, text " << i;
+  }
+  EXPECT_EQ(DecryptField(texts[2]), "L/H Guard £5 – €");
+
+  // Bytes past the last whole block are dropped as DecryptField drops them.
+  const std::string extra = EncryptField("door") + "ABCD";
+  std::array<std::string_view, 2> two = {extra, texts[1]};
+  std::array<std::string, 2> out;
+  DecryptFields(two, out);
+  EXPECT_EQ(out[0], "door");
+  EXPECT_EQ(out[1], "12.50");
+
+  // A text that cannot be read raises its error wherever it stands.
+  for (const char* bad : {"C8FAD48D7DE5054G", "C8FAD48D7DE505", "C8FAD48D7DE50547ZZ"}) {
+    const std::array<std::string_view, 3> withBad = {texts[1], bad, texts[2]};
+    std::array<std::string, 3> values;
+    EXPECT_EQ(ErrorNumber([&] { DecryptFields(withBad, values); }),
+              ErrorNumber([&] { DecryptField(bad); }))
+        << bad;
+    EXPECT_NE(ErrorNumber([&] { DecryptField(bad); }), 0) << bad;
+  }
+  // The values must have a place for every text.
+  std::array<std::string, 1> tooFew;
+  EXPECT_EQ(ErrorNumber([&] { DecryptFields(two, tooFew); }), err::kInvalidCall);
 }
 
 TEST_F(FieldTest, Windows1252Boundary) {
