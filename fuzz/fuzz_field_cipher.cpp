@@ -1,5 +1,6 @@
 // Enciphered field texts and their hexadecimal forms: any text deciphers or
-// is refused with an error, and every value that enciphers deciphers back.
+// is refused with an error, texts deciphered together read as each alone,
+// and every value that enciphers deciphers back.
 #include "cipher/byte_utils.hpp"
 #include "cipher/field.hpp"
 #include "text/error.hpp"
@@ -8,6 +9,8 @@
 #include <cstdint>
 #include <cstdlib>
 #include <string>
+#include <string_view>
+#include <vector>
 
 using namespace belvane;
 
@@ -16,6 +19,33 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   try {
     (void)cipher::DecryptField(s);
   } catch (const Error&) {
+  }
+  // Split at '|', the pieces deciphered together read as each alone, and
+  // fail together when one fails.
+  {
+    std::vector<std::string_view> pieces;
+    for (std::size_t begin = 0;;) {
+      const std::size_t bar = s.find('|', begin);
+      pieces.push_back(std::string_view(s).substr(begin, bar - begin));
+      if (bar == std::string::npos) break;
+      begin = bar + 1;
+    }
+    std::vector<std::string> alone;
+    bool failed = false;
+    for (std::string_view p : pieces) {
+      try {
+        alone.push_back(cipher::DecryptField(p));
+      } catch (const Error&) {
+        failed = true;
+      }
+    }
+    std::vector<std::string> together(pieces.size());
+    try {
+      cipher::DecryptFields(pieces, together);
+      if (failed || together != alone) std::abort();
+    } catch (const Error&) {
+      if (!failed) std::abort();
+    }
   }
   try {
     (void)cipher::HexToString(s);

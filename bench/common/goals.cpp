@@ -8,6 +8,7 @@
 #include <map>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace belvane::bench {
@@ -36,7 +37,7 @@ public:
     ConsoleReporter::ReportRuns(runs);
     for (const Run& run : runs) {
       if (run.run_type != Run::RT_Iteration || run.error_occurred || run.iterations == 0) continue;
-      auto& measures = seen_[run.benchmark_name()];
+      auto& measures = seen_[NameWithoutIterations(run.benchmark_name())];
       const bool wall = !run.run_name.time_type.empty(); // manual or real time asked for
       const double perIteration = (wall ? run.real_accumulated_time : run.cpu_accumulated_time) /
                                   static_cast<double>(run.iterations);
@@ -58,6 +59,16 @@ public:
   }
 
 private:
+  // A run's name without the "/iterations:N" a fixed iteration count adds,
+  // so that a goal names its benchmark the same however many iterations it
+  // is given.
+  static std::string NameWithoutIterations(std::string name) {
+    const std::size_t at = name.find("/iterations:");
+    if (at == std::string::npos) return name;
+    const std::size_t end = name.find('/', at + 1);
+    name.erase(at, end == std::string::npos ? std::string::npos : end - at);
+    return name;
+  }
   static void Keep(std::map<std::string, double>& measures, const std::string& name, double v,
                    bool least) {
     auto [it, added] = measures.emplace(name, v);
@@ -128,6 +139,11 @@ void AddValueGoal(std::string what, Measure figure, double limit, Limit kind, st
 }
 
 int RunWithGoals(int argc, char** argv) {
+  // With a filter only some benchmarks run, and only their goals are
+  // reported; without one every goal is, those not measured as NOT RUN.
+  bool filtered = false;
+  for (int i = 1; i < argc; ++i)
+    filtered = filtered || std::string_view(argv[i]).starts_with("--benchmark_filter");
   benchmark::Initialize(&argc, argv);
   if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 1;
   GoalReporter reporter;
@@ -136,7 +152,7 @@ int RunWithGoals(int argc, char** argv) {
 
   std::vector<std::string> rows;
   for (const Goal& g : Goals()) {
-    if (!reporter.Find(g.figure)) continue; // not selected in this run
+    if (filtered && !reporter.Find(g.figure)) continue; // not selected in this run
     rows.push_back(Row(g, reporter));
   }
   if (rows.empty()) return 0;

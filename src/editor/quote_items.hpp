@@ -33,7 +33,9 @@ bool FindItemId(data::Recordset& items, const std::string& id);
 // One field write of a planned write-back, with the grid column its value
 // comes from (-1: from the session), so a refused value can be named.
 struct FieldWrite {
-  FieldWrite(const char* f, data::Value v, int c) : field(f), value(std::move(v)), column(c) {}
+  // The value is made in place from whatever a Value is made of.
+  template <class V>
+  FieldWrite(const char* f, V&& v, int c) : field(f), value(std::forward<V>(v)), column(c) {}
   const char* field;
   data::Value value;
   int column;

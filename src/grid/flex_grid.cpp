@@ -306,8 +306,8 @@ void FlexGrid::AddItem(std::string_view item) {
   Notify([index](ModelObserver& o) { o.RowsInserted(index, 1); });
 }
 
-void FlexGrid::AddItemFrom(const FlexGrid& source, int sourceRow, int count,
-                           std::string_view next) {
+void FlexGrid::AddItemFrom(const FlexGrid& source, int sourceRow, int count, std::string_view next,
+                           bool withFormats) {
   source.CheckRow(sourceRow);
   if (count < 0 || count > source.cols_) throw Error(err::kInvalidColValue, "Invalid Col value");
   const int copied = std::min(count, cols_);
@@ -328,6 +328,16 @@ void FlexGrid::AddItemFrom(const FlexGrid& source, int sourceRow, int count,
     if (copiedBytes != 0) std::memcpy(texts, from.data() + HeaderBytes(source.cols_), copiedBytes);
     if (nextBytes != 0) std::memcpy(texts + copiedBytes, next.data(), nextBytes);
     row.cells = std::move(packed);
+  }
+  const auto& fromExtras = source.rows_[static_cast<std::size_t>(sourceRow)].extras;
+  if (withFormats && fromExtras) {
+    const auto& cells = fromExtras->cells; // sorted by column
+    const auto end = std::lower_bound(cells.begin(), cells.end(), copied,
+                                      [](const auto& entry, int c) { return entry.first < c; });
+    if (end != cells.begin()) {
+      row.extras = std::make_unique<RowExtras>();
+      row.extras->cells.assign(cells.begin(), end);
+    }
   }
   rows_.push_back(std::move(row));
   const int index = Rows() - 1;

@@ -106,7 +106,10 @@ public:
   // and whose other cells are empty: the same row AddItem makes of those
   // texts joined by tabs, copied without splitting them again. Cells past
   // this grid's last column are dropped. `source` may be this grid.
-  void AddItemFrom(const FlexGrid& source, int sourceRow, int count, std::string_view next);
+  // With `withFormats`, the copied cells keep their formats too (colours,
+  // fonts, alignment), so a row copied from a list looks as it does there.
+  void AddItemFrom(const FlexGrid& source, int sourceRow, int count, std::string_view next,
+                   bool withFormats = false);
   // Removes a data row (1 to Rows() - 1); rows below move up. Removing the
   // last data row leaves the header alone.
   void RemoveItem(int index);

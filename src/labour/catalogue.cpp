@@ -271,12 +271,13 @@ void frmLabour::SearchLabourItems() {
       if (!text::ContainsNoCase(cat.TextView(i, col::kItemNo), needle) &&
           !text::ContainsNoCase(cat.TextView(i, col::kDescription), needle))
         continue;
-      // The item's six cells, then its row in the schedule grid.
+      // The item's six cells, greyed as they are in the schedule grid (by
+      // the item's mask), then its row there.
       char number[16];
       const char* end = std::to_chars(number, number + sizeof number, i).ptr;
-      fgSearch.AddItemFrom(cat, i, 6, std::string_view(number, static_cast<size_t>(end - number)));
+      fgSearch.AddItemFrom(cat, i, 6, std::string_view(number, static_cast<size_t>(end - number)),
+                           true);
       last = fgSearch.Rows() - 1;
-      GreyByMask(fgSearch, last, MaskOf(cat.TextView(i, 5)));
     }
     // The last result is current, as adding each one made it.
     if (last > 0) fgSearch.Row(last);

@@ -293,9 +293,9 @@ std::vector<PlannedRecord> PlanWrites(const grid::FlexGrid& g, const std::string
       auto flagValue = [&](int c, std::vector<FieldWrite>& out, const char* field) {
         const std::string f = g.TextMatrix(r, c);
         if (f == kTicked)
-          out.emplace_back(field, Value(int16_t{1}), c);
+          out.emplace_back(field, int16_t{1}, c);
         else if (f == kUnticked)
-          out.emplace_back(field, Value(int16_t{0}), c);
+          out.emplace_back(field, int16_t{0}, c);
       };
       auto& w = p.writes;
       w.emplace_back("DELITEM", Value(false), -1);
@@ -304,7 +304,8 @@ std::vector<PlannedRecord> PlanWrites(const grid::FlexGrid& g, const std::string
       w.emplace_back("itemno", Value(itemNo), col::kItemNo);
       w.emplace_back("script", Value(desc), col::kDescription);
       w.emplace_back("Category", Value(op.category), -1);
-      w.emplace_back(op.hoursField, Value(*number), op.hoursCol);
+      const double hoursNumber = *number;
+      w.emplace_back(op.hoursField, hoursNumber, op.hoursCol);
       flagValue(op.reportCol, w, "report_on");
       if (op.hoursCol == col::kPTHours) flagValue(col::kBlend, w, "blend");
       // An empty "Allow" cell (a line typed by hand) is stored as Null,
@@ -313,7 +314,7 @@ std::vector<PlannedRecord> PlanWrites(const grid::FlexGrid& g, const std::string
       w.emplace_back("allow_tick", text::Trim(allow).empty() ? Value() : Value(allow), col::kAllow);
       const std::string rev = g.TextMatrix(r, col::kRev);
       w.emplace_back("Rev", rev.empty() ? Value() : Value(rev), col::kRev);
-      w.emplace_back("tag", Value(*number < 0 ? "D" : "1"), op.hoursCol);
+      w.emplace_back("tag", Value(hoursNumber < 0 ? "D" : "1"), op.hoursCol);
       if (op.hoursCol == col::kRRHours) {
         const std::string rate = g.TextMatrix(r, col::kRate);
         // "<Default>", or no rate at all on a line typed by hand, is the

@@ -169,6 +169,30 @@ TEST(FlexGridRows, AddItemFromMakesTheRowAddItemMakesOfTheSameTexts) {
   }
 }
 
+TEST(FlexGridRows, AddItemFromKeepsTheCopiedCellsFormatsOnlyWhenAsked) {
+  FlexGrid source;
+  source.Cols(4);
+  source.AddItem("a\tb\tc\td");
+  source.CellBackColorAt(2, 0, kGrey);
+  source.CellFontItalicAt(2, 1, true);
+  source.CellBackColorAt(2, 3, kYellow); // past the cells copied
+  FlexGrid copy;
+  copy.Cols(4);
+  copy.AddItemFrom(source, 2, 3, "x", true);
+  copy.AddItemFrom(source, 2, 3, "x");
+  copy.AddItemFrom(copy, 2, 2, "y", true); // from its own row, as the grid grows
+  EXPECT_EQ(copy.CellStyleAt(2, 0).backColor, kGrey);
+  EXPECT_TRUE(copy.CellStyleAt(2, 1).fontItalic);
+  EXPECT_EQ(copy.CellStyleAt(2, 3).backColor, copy.CellStyleAt(1, 3).backColor);
+  EXPECT_EQ(copy.CellStyleAt(3, 0).backColor, copy.CellStyleAt(1, 0).backColor);
+  EXPECT_FALSE(copy.CellStyleAt(3, 1).fontItalic);
+  EXPECT_EQ(copy.CellStyleAt(4, 0).backColor, kGrey);
+  EXPECT_TRUE(copy.CellStyleAt(4, 1).fontItalic);
+  // The copy's formats are its own.
+  source.CellBackColorAt(2, 0, kWhite);
+  EXPECT_EQ(copy.CellStyleAt(2, 0).backColor, kGrey);
+}
+
 TEST(FlexGridRows, AddItemFromItsOwnRowsAndOutOfRange) {
   FlexGrid g;
   g.Cols(3);
