@@ -298,7 +298,7 @@ std::vector<PlannedRecord> PlanWrites(const grid::FlexGrid& g, const std::string
           out.emplace_back(field, int16_t{0}, c);
       };
       auto& w = p.writes;
-      w.emplace_back("DELITEM", Value(false), -1);
+      w.emplace_back("DELITEM", false, -1);
       w.emplace_back("qtnno", Value(quoteNo), -1);
       w.emplace_back("subquote", Value(subQuoteNo), -1);
       w.emplace_back("itemno", Value(itemNo), col::kItemNo);
@@ -327,7 +327,7 @@ std::vector<PlannedRecord> PlanWrites(const grid::FlexGrid& g, const std::string
         else if (m == kUnticked)
           w.emplace_back("partno", Value(""), col::kMechanical);
       } else {
-        w.emplace_back("rr_rate2", Value(op.hoursCol == col::kRAHours ? raRate : ptRate), -1);
+        w.emplace_back("rr_rate2", op.hoursCol == col::kRAHours ? raRate : ptRate, -1);
       }
       plan.push_back(std::move(p));
     }

@@ -56,7 +56,7 @@ std::string RefusedValueAdvice(const FieldWrite& w) {
 void AddNumberCell(std::vector<FieldWrite>& writes, const char* field, const std::string& cellText,
                    int column) {
   if (text::Trim(cellText).empty())
-    writes.emplace_back(field, Value(int16_t{0}), column);
+    writes.emplace_back(field, int16_t{0}, column);
   else
     writes.emplace_back(field, Value(cellText), column);
 }
@@ -95,9 +95,9 @@ std::vector<PlannedRecord> PlanWrites(const grid::FlexGrid& g, const std::string
     w.emplace_back("partno", Value(text::Trim(cell(sel::kPartNo))), sel::kPartNo);
     const std::string report = cell(sel::kReport);
     if (report == kTicked)
-      w.emplace_back("report_on", Value(int16_t{1}), sel::kReport);
+      w.emplace_back("report_on", int16_t{1}, sel::kReport);
     else if (report == kUnticked)
-      w.emplace_back("report_on", Value(int16_t{0}), sel::kReport);
+      w.emplace_back("report_on", int16_t{0}, sel::kReport);
     const std::string rev = cell(sel::kRev);
     w.emplace_back("Rev", rev.empty() ? Value() : Value(rev), sel::kRev);
     w.emplace_back("tag", Value("1"), -1);
