@@ -5,7 +5,7 @@ BUILD ?= build
 BUILD_ASAN ?= build-asan
 # Benchmarks build optimised in a directory of their own, whatever BUILD is.
 BUILD_BENCH ?= build-bench
-BENCH_ARGS ?= --benchmark_repetitions=3
+BENCH_ARGS ?= --benchmark_repetitions=5
 JOBS ?= $(shell nproc)
 CMAKE_FLAGS ?=
 GENERATOR := $(shell command -v ninja >/dev/null 2>&1 && echo "-G Ninja")
