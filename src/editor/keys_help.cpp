@@ -1,5 +1,7 @@
 #include "editor/keys_help.hpp"
 
+#include "forms/control.hpp"
+#include "forms/keys.hpp"
 #include "forms/runtime.hpp"
 
 #include <string>
@@ -22,6 +24,13 @@ void ShowKeysHelp(std::string_view title, std::string_view editorLines) {
   text += "\r\n\r\n";
   text += kWindowKeys;
   forms::MsgBox(text, forms::msgbox::kInformation, title);
+}
+
+WindowKey WindowKeyOf(int keyCode, int shift, const forms::Control* focused) {
+  if (keyCode == forms::keys::kF1 && shift == 0) return WindowKey::kHelp;
+  if (shift != forms::kCtrlMask || (keyCode != 'Z' && keyCode != 'Y')) return WindowKey::kNone;
+  if (focused && focused->Kind() == forms::ControlKind::TextBox) return WindowKey::kNone;
+  return keyCode == 'Z' ? WindowKey::kUndo : WindowKey::kRedo;
 }
 
 } // namespace belvane::editor

@@ -385,20 +385,25 @@ void frmLabour::Form_Resize() {
 }
 
 void frmLabour::Form_KeyDown(int& keyCode, int shift) {
-  if (keyCode == forms::keys::kF1 && shift == 0) {
+  // Deletions are taken back and redone only while editing.
+  switch (editor::WindowKeyOf(keyCode, shift, ActiveControl())) {
+  case editor::WindowKey::kHelp:
     keyCode = 0;
     cmdHelp_Click();
-    return;
-  }
-  // Ctrl+Z takes back the last deletion, Ctrl+Y does it again, wherever
-  // the focus is but in a text box.
-  if (shift != forms::kCtrlMask || (keyCode != 'Z' && keyCode != 'Y') || meMode != eEdit) return;
-  if (ActiveControl() && ActiveControl()->Kind() == forms::ControlKind::TextBox) return;
-  if (keyCode == 'Z')
+    break;
+  case editor::WindowKey::kUndo:
+    if (meMode != eEdit) break;
+    keyCode = 0;
     UndoDeletion();
-  else
+    break;
+  case editor::WindowKey::kRedo:
+    if (meMode != eEdit) break;
+    keyCode = 0;
     RedoDeletion();
-  keyCode = 0;
+    break;
+  case editor::WindowKey::kNone:
+    break;
+  }
 }
 
 void frmLabour::cmdHelp_Click() {

@@ -108,6 +108,23 @@ TEST_F(UndoTest, TheOnlyLineAndTheDescriptionWidthComeBack) {
   });
 }
 
+TEST_F(UndoTest, InATextBoxCtrlZIsTheBoxsOwn) {
+  ThreeLines();
+  Open(eEdit, [&](frmLabour& f) {
+    auto& g = f.FGSelectedLabour;
+    Delete(f, 3);
+    ASSERT_EQ(g.Rows(), 3);
+    user.Click(f.txtSearch);
+    Undo();
+    EXPECT_EQ(g.Rows(), 3); // the search box keeps the key
+    user.ClickCell(g, 1, col::kItemNo);
+    Undo();
+    EXPECT_EQ(g.Rows(), 4);
+    user.Click(f.cmdClose);
+  });
+  EXPECT_EQ(Records(), (std::vector<std::string>{"100 R&R 1.5", "120 PAINT 2", "140 R&R 3"}));
+}
+
 TEST_F(UndoTest, ViewModeTakesNothingBack) {
   ThreeLines();
   Open(eView, [&](frmLabour& f) {
