@@ -40,15 +40,20 @@ constexpr std::array<std::int8_t, 256> kDigitValue = [] {
               "Belvane.Cipher");
 }
 
-// Decodes the digit pairs of `hex` into `out`, which has room for them.
+// The value of the digit pair at `at`, or a negative number when either
+// digit is not hexadecimal.
+int PairValue(std::string_view hex, std::size_t at) {
+  const int hi = kDigitValue[static_cast<unsigned char>(hex[at])];
+  const int lo = kDigitValue[static_cast<unsigned char>(hex[at + 1])];
+  return (hi | lo) < 0 ? -1 : hi << 4 | lo;
+}
+
+// Decodes the digit pairs of `hex` into `out`, which has room for them;
+// raises error 13 naming the first pair that is not hexadecimal.
 void DecodePairs(std::string_view hex, std::uint8_t* out) {
-  const std::size_t count = hex.size() / 2;
-  for (std::size_t i = 0; i < count; ++i) {
-    const int hi = kDigitValue[static_cast<unsigned char>(hex[2 * i])];
-    const int lo = kDigitValue[static_cast<unsigned char>(hex[2 * i + 1])];
-    if (hi < 0 || lo < 0) BadPair(hex, 2 * i);
-    out[i] = static_cast<std::uint8_t>(hi << 4 | lo);
-  }
+  if (TryHexToBytes(hex, out)) return;
+  for (std::size_t at = 0;; at += 2)
+    if (PairValue(hex, at) < 0) BadPair(hex, at);
 }
 
 } // namespace
@@ -66,15 +71,14 @@ std::size_t HexToBytes(std::string_view hex, std::span<std::uint8_t> bytes) {
 }
 
 bool TryHexToBytes(std::string_view hex, std::uint8_t* out) {
-  // A bad digit looks up as -1 and sets the sign bit of `bad`, so one test at
+  // A bad pair is negative and sets the sign bit of `bad`, so one test at
   // the end covers them all.
   const std::size_t count = hex.size() / 2;
   int bad = 0;
   for (std::size_t i = 0; i < count; ++i) {
-    const int hi = kDigitValue[static_cast<unsigned char>(hex[2 * i])];
-    const int lo = kDigitValue[static_cast<unsigned char>(hex[2 * i + 1])];
-    bad |= hi | lo;
-    out[i] = static_cast<std::uint8_t>((hi & 0xF) << 4 | (lo & 0xF));
+    const int v = PairValue(hex, 2 * i);
+    bad |= v;
+    out[i] = static_cast<std::uint8_t>(v);
   }
   return bad >= 0;
 }

@@ -184,6 +184,18 @@ namespace {
 // DecryptField one text at a time, for the texts the batch below does not
 // take: a text with bytes past its last whole block, or one it cannot read,
 // for which this raises the error.
+// The deciphered bytes as UTF-8 into `value`. Most catalogue values are
+// plain ASCII, which reads the same in Windows-1252 and UTF-8.
+void AssignUtf8(std::string& value, std::string_view bytes) {
+  bool ascii = true;
+  for (char c : bytes)
+    ascii &= static_cast<unsigned char>(c) < 0x80;
+  if (ascii)
+    value.assign(bytes);
+  else
+    value = text::Cp1252ToUtf8(bytes);
+}
+
 std::string DecryptOneField(std::string_view fieldText) {
   std::string bytes = HexToString(fieldText);
   if (bytes.size() < kBlowfishBlockBytes) {
@@ -195,10 +207,9 @@ std::string DecryptOneField(std::string_view fieldText) {
   }
   EnsureKeyed();
   BlowfishDecryptInPlace(bytes);
-  for (char c : bytes) {
-    if (static_cast<unsigned char>(c) >= 0x80) return text::Cp1252ToUtf8(bytes);
-  }
-  return bytes;
+  std::string value;
+  AssignUtf8(value, bytes);
+  return value;
 }
 
 // Room on the stack for the blocks of a catalogue row's fields.
@@ -267,15 +278,7 @@ void DecryptFields(std::span<const std::string_view> fieldTexts, std::span<std::
     if (pad <= kBlowfishBlockBytes) end -= pad;
     const std::string_view kept(reinterpret_cast<const char*>(buffer + begin), end - begin);
     begin += length;
-    // Most catalogue values are plain ASCII, which reads the same in
-    // Windows-1252 and UTF-8.
-    bool ascii = true;
-    for (char c : kept)
-      ascii &= static_cast<unsigned char>(c) < 0x80;
-    if (ascii)
-      values[i].assign(kept);
-    else
-      values[i] = text::Cp1252ToUtf8(kept);
+    AssignUtf8(values[i], kept);
   }
 }
 

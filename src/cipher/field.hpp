@@ -77,8 +77,8 @@ std::string DecryptField(std::string_view fieldText);
 
 // DecryptField of each of `fieldTexts`, into the element of `values` at the
 // same place (their counts must match: error 5 otherwise). The blocks of all
-// the texts are deciphered side by side, which is much faster than one text
-// at a time when each value is a block or two, as in a catalogue row. Raises
+// the texts are deciphered side by side, about twice as fast as one text at
+// a time when each value is a block or two, as in a catalogue row. Raises
 // what DecryptField raises for the first text it cannot read; the values are
 // then unspecified.
 void DecryptFields(std::span<const std::string_view> fieldTexts, std::span<std::string> values);
